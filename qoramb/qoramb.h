@@ -1,0 +1,59 @@
+// Byte-string routines that respect character boundaries in the interface
+// encoding: the code page of the current locale, or UTF-8. Each entry point
+// picks its implementation from the process-wide interface encoding flag.
+//
+// Texts are byte strings, zero-terminated unless a length is given; a length
+// of -1 means "up to the terminator". No routine reads past the length it is
+// given or past a terminator.
+#pragma once
+
+#include <cstddef>
+#include <unicode/ucnv.h>
+#include <unicode/umachine.h>
+
+// The interface encoding flag: 0 code-page mode (the state at load), 1 UTF-8.
+int mbIsUtf8Mode();
+void mbSetUtf8Mode(int flag);
+// Changes with every change of the interface encoding or of the current
+// code-page converter, so caches of converted text can tell they are stale.
+unsigned mbGeneration();
+
+// Byte length of the character at text; 0 for an empty text, -1 when the
+// bytes do not form a whole character within n bytes.
+int mbCharLength(const char* text, size_t n);
+
+// Case mapping in place: never changes the byte length of the text; a shorter
+// result is padded with blanks.
+void mbToUpperInPlace(char* text);
+void mbToLowerInPlace(char* text);
+// Case mapping into a separate destination of dstLen bytes; returns the
+// number of bytes written. A srcLen of -1 runs to the terminator.
+int mbToUpper(const char* src, int srcLen, char* dst, int dstLen, int* error);
+int mbToLower(const char* src, int srcLen, char* dst, int dstLen, int* error);
+
+// 1 when the texts are equal after case folding, else 0. error (may be null)
+// is set to 3 when a text is malformed.
+int mbEqualNoCase(const char* a, int lenA, const char* b, int lenB, int* error);
+// -1, 0 or 1: the case-folded ordering of two zero-terminated texts.
+int mbCompareNoCase(const char* a, const char* b);
+
+// Terminates text at the largest whole-character boundary not beyond n bytes.
+char* mbTruncate(char* text, int n);
+// Copies the longest run of whole characters that fits in size - 1 bytes and
+// zero-fills the rest of the size bytes.
+void mbCopyBounded(char* dst, const char* src, size_t size);
+// Copies the longest run of whole characters that fits within
+// min(size, srcLen) bytes and blank-fills the rest of size (no terminator).
+void mbCopyPadded(char* dst, size_t size, const char* src, int srcLen);
+// The last occurrence of the code point c in text, or null.
+const char* mbFindLastChar(const char* text, UChar32 c);
+
+// Conversion between a code page (the converter's, or the current one when
+// cnv is null) and UTF-8, independent of the interface encoding. Returns the
+// number of bytes in the destination; error is 0, 1 (cut) or 3 (lossy).
+int mbCodePageToUtf8(UConverter* cnv, char* dst, int dstSize, const char* src, int srcLen,
+                     int* error);
+int mbUtf8ToCodePage(UConverter* cnv, char* dst, int dstSize, const char* src, int srcLen,
+                     int* error);
+int mbCodePageToUtf8Length(UConverter* cnv, const char* src, int srcLen, int* error);
+int mbUtf8ToCodePageLength(UConverter* cnv, const char* src, int srcLen, int* error);
