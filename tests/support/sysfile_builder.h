@@ -219,7 +219,8 @@ class SysFileBuilder {
     // Case data. One value per variable; numbers for numeric variables,
     // strings for string variables (a mismatch is written as given).
     SysFileBuilder& Case(std::vector<Value> values);
-    // Bytes appended after the cases (after the last block when compressed).
+    // Bytes appended after the cases (after the last block when compressed),
+    // e.g. hand-made blocks; they do not count as cases in the header.
     SysFileBuilder& Data(Bytes bytes);
 
     // Encoders in the builder's byte order.
