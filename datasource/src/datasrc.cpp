@@ -4,6 +4,8 @@
 #include <cstring>
 #include <ctime>
 
+#include "specialvalues.h"
+
 namespace {
 
 // The local time in seconds since 14 October 1582 (proleptic Gregorian).

@@ -8,10 +8,6 @@
 
 #include "varimpl.h"
 
-// The special values, until the shared definitions are in place.
-double SysmisValue();
-double HighestValue();
-
 // A print or write format as (type code, width, decimals).
 struct QORA_Format {
     int code;

@@ -7,6 +7,8 @@
 #include <limits>
 #include <string>
 
+#include "specialvalues.h"
+
 namespace {
 
 double FromBits(uint64_t bits) {
