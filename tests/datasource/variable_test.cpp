@@ -266,7 +266,9 @@ TEST(VariableTest, EqualityIgnoresIdentityAndUnusedSlots) {
     b.SetValueLabels(same);
     EXPECT_TRUE(a == b);
 
-    b.EditAttributes().Set("role", {"input"});
+    Attributes roles;
+    roles.Set("role", {"input"});
+    b.SetAttributes(roles);
     EXPECT_FALSE(a == b);
     a.SetAttributes(b.GetAttributes());
     EXPECT_TRUE(a == b);
