@@ -5,6 +5,7 @@
 #include <random>
 
 #include "dserror.h"
+#include "qoramb.h"
 
 namespace {
 
@@ -217,6 +218,29 @@ TEST(AttributesTest, PresentedNamesOfArrays) {
     EXPECT_EQ(Attributes::PresentedName("Size", 12, 12), "Size[12]");
     EXPECT_EQ(Attributes::PresentedName("Size", 5, 100), "Size[005]");
     EXPECT_EQ(Attributes::PresentedName("Size", 2, 9), "Size[2]");
+}
+
+}  // namespace
+
+namespace {
+
+// Runs a check in UTF-8 mode and restores the interface encoding after it.
+struct Utf8Mode {
+    int saved = mbIsUtf8Mode();
+    Utf8Mode() { mbSetUtf8Mode(1); }
+    ~Utf8Mode() { mbSetUtf8Mode(saved); }
+};
+
+TEST(AttributesTest, MultibyteNamesInUtf8Mode) {
+    Utf8Mode utf8;
+    auto check = [](const std::string& s) { return Attributes::CheckName(s.data(), s.size()); };
+    EXPECT_EQ(check("\xc3\xa9t\xc3\xa9"), 0);
+    EXPECT_EQ(check("a\xc3"), 4);  // a character cut short
+    EXPECT_EQ(check("a\xa9"), 4);  // a stray trail byte
+    Attributes a;
+    ASSERT_TRUE(Parse(a, "\xc3\xa9t\xc3\xa9('1'\n)a\xc3('2'\n)"));
+    ASSERT_EQ(a.Size(), 1);
+    EXPECT_EQ(a.IndexOf("\xc3\x89T\xc3\x89"), 0);  // case ignored beyond ASCII
 }
 
 }  // namespace

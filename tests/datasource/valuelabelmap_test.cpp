@@ -5,6 +5,8 @@
 #include <cmath>
 #include <cstring>
 
+#include "qoramb.h"
+
 namespace {
 
 std::string Units(double value) {
@@ -218,6 +220,20 @@ TEST(VLMapTest, SharedMapOfTwoHoldersStaysApart) {
     EXPECT_EQ(varB.Lookup(2.0), nullptr);
     EXPECT_TRUE(varB.SameObject(read));
     EXPECT_EQ(read.Impl()->RefCount(), 2);
+}
+
+}  // namespace
+
+namespace {
+
+TEST(VLMapTest, TextKeysAreCutAtWholeCharacters) {
+    int saved = mbIsUtf8Mode();
+    mbSetUtf8Mode(1);
+    QORA_VLMap map(16);
+    std::string text = std::string(15, 'a') + "\xc3\xa9";
+    map.Insert(text.c_str(), static_cast<int>(text.size()), "x");
+    mbSetUtf8Mode(saved);
+    EXPECT_EQ(map.Impl()->Pairs()[0].key, std::string(15, 'a') + " ");
 }
 
 }  // namespace
