@@ -9,6 +9,7 @@
 #include <cstdio>
 #include <cstdlib>
 #include <cstring>
+#include <vector>
 
 #include "qoralocale.h"
 #include "qoralock.h"
@@ -29,11 +30,28 @@ const CodePageName kCodePages[] = {
 };
 
 // Process-wide state: replaced only while no file is open and no call
-// overlaps, so it needs no lock. Replaced objects stay open: a caller may
-// still hold the pointer it was given.
+// overlaps, so it needs no lock. A replaced converter or collator stays open
+// until unload: a caller may still hold the pointer it was given.
 UConverter* gConverter = nullptr;
 std::atomic<unsigned> gConverterChanges{0};
 UCollator* gCollator = nullptr;
+
+struct CollatorCloser {
+    void operator()(UCollator* coll) const { ucol_close(coll); }
+};
+
+// Takes ownership until unload and returns the converter.
+UConverter* Retain(UConverter* cnv) {
+    static std::vector<ConverterPtr> retained;
+    retained.emplace_back(cnv);
+    return cnv;
+}
+
+UCollator* Retain(UCollator* coll) {
+    static std::vector<std::unique_ptr<UCollator, CollatorCloser>> retained;
+    retained.emplace_back(coll);
+    return coll;
+}
 
 // The one process-wide lock; the locale lookup works on the shared texts below.
 CriticalSection gLocaleLock;
@@ -227,8 +245,10 @@ UConverter* OpenConverter(const char* name) {
 
 UConverter* CurrentConverter() {
     if (!gConverter) {
-        gConverter = OpenConverter(nullptr);
-        ++gConverterChanges;
+        if (UConverter* cnv = OpenConverter(nullptr)) {
+            gConverter = Retain(cnv);
+            ++gConverterChanges;
+        }
     }
     return gConverter;
 }
@@ -255,7 +275,7 @@ bool SetCodePageConverter(const char* name) {
     UConverter* cnv = OpenConverter(name);
     if (!cnv) return false;
     if (!gConverter || strcmp(ConverterName(cnv), ConverterName(gConverter)) != 0) {
-        gConverter = cnv;
+        gConverter = Retain(cnv);
         ++gConverterChanges;
     } else {
         ucnv_close(cnv);
@@ -266,8 +286,8 @@ bool SetCodePageConverter(const char* name) {
 UCollator* CurrentCollator() {
     if (!gCollator) {
         UErrorCode err = U_ZERO_ERROR;
-        gCollator = ucol_open(uloc_getDefault(), &err);
-        if (U_FAILURE(err)) gCollator = nullptr;
+        UCollator* coll = ucol_open(uloc_getDefault(), &err);
+        if (U_SUCCESS(err)) gCollator = Retain(coll);
     }
     return gCollator;
 }
@@ -280,7 +300,7 @@ bool SetCollatorLocale(const char* locale) {
     if (current && ValidLocale(coll) == ValidLocale(current)) {
         ucol_close(coll);
     } else {
-        gCollator = coll;
+        gCollator = Retain(coll);
     }
     return true;
 }
@@ -342,8 +362,11 @@ bool NameMatches(const std::string& part, const char* english, const char* iso) 
 }  // namespace
 
 void LocaleToIsoCodes(std::string& language, std::string& country) {
+    LocaleNameToIsoCodes(setlocale(LC_CTYPE, nullptr), language, country);
+}
+
+void LocaleNameToIsoCodes(const char* name, std::string& language, std::string& country) {
     CriticalSection::Lock lock(gLocaleLock);
-    const char* name = setlocale(LC_CTYPE, nullptr);
     gLocaleLanguage.clear();
     gLocaleCountry.clear();
     if (const char* underscore = name ? strchr(name, '_') : nullptr) {

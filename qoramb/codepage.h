@@ -46,6 +46,10 @@ bool IsSameEncoding(const char* a, const char* b);
 // The ISO 639 language and ISO 3166 country codes of the runtime's current
 // character-type locale; "en" and "" when it matches no known locale.
 void LocaleToIsoCodes(std::string& language, std::string& country);
+// The same for a locale name of the form language_country.codepage, where
+// language and country are English names ("German_Germany.1252") or ISO codes
+// ("de_DE.UTF-8"); a POSIX modifier ("@euro") is ignored.
+void LocaleNameToIsoCodes(const char* name, std::string& language, std::string& country);
 
 // The current code-page converter, created on first use. Never close it:
 // convert through a clone.

@@ -274,11 +274,13 @@ int Convert(bool toUtf8, UConverter* cnv, char* dst, int dstSize, const char* sr
     if (n > c) {
         // Cut to whole characters, also when there is no room at all, so that
         // neither the count nor the terminator ever goes past the buffer.
-        n = toUtf8 ? (c > 0 ? Utf8CutPoint(dst, c) : 0) : [&] {
+        n = 0;
+        if (c > 0) {
             CharCodec codec(cnv);
-            return static_cast<int>(CodecRun(codec, dst, strnlen(dst, c), true));
-        }();
-        memset(dst + n, ' ', c - n);
+            n = toUtf8 ? Utf8CutPoint(dst, c)
+                       : static_cast<int>(CodecRun(codec, dst, strnlen(dst, c), true));
+            memset(dst + n, ' ', c - n);
+        }
     } else if (n < c && !terminate) {
         dst[n] = ' ';
     }
