@@ -211,9 +211,10 @@ int CompareNoCase(const char* a, size_t lenA, const char* b, size_t lenB, int* e
         UChar32 cp;
         int length = codec.Next(text + pos, n - pos, &cp);
         if (length == 0 || cp < 0) {
-            // A malformed sequence: its first byte stands for itself.
+            // A malformed sequence: its first byte stands for itself, unfolded.
             if (error) *error = 3;
-            length = 1, cp = static_cast<unsigned char>(text[pos]);
+            pos += 1;
+            return static_cast<UChar32>(static_cast<unsigned char>(text[pos - 1]));
         }
         pos += length;
         return u_tolower(cp);
@@ -243,32 +244,52 @@ int ErrorOf(UErrorCode err) {
     return 0;
 }
 
-// Converts between a code page and UTF-8 with the cut, blank and terminator
-// rules of the conversion entry points.
+// One conversion between a code page and UTF-8 through the given converter,
+// or a private clone of the current one when none is given.
+class Conversion {
+  public:
+    Conversion(bool toUtf8, UConverter* cnv)
+        : fToUtf8(toUtf8),
+          fClone(cnv ? nullptr : CloneConverter(nullptr)),
+          fCnv(cnv ? cnv : fClone.get()) {}
+
+    UConverter* Converter() const { return fCnv; }
+
+    // ICU's algorithmic conversion from the start state of the direction:
+    // at most capacity bytes go to dst; returns the full length needed.
+    int Run(char* dst, int capacity, const char* src, int srcLen, UErrorCode* err) {
+        const char* source = src ? src : "";
+        int length = srcLen < 0 ? static_cast<int>(strlen(source)) : src ? srcLen : 0;
+        if (fToUtf8) {
+            ucnv_resetToUnicode(fCnv);
+            return ucnv_toAlgorithmic(UCNV_UTF8, fCnv, dst, capacity, source, length, err);
+        }
+        ucnv_resetFromUnicode(fCnv);
+        return ucnv_fromAlgorithmic(fCnv, UCNV_UTF8, dst, capacity, source, length, err);
+    }
+
+  private:
+    bool fToUtf8;
+    ConverterPtr fClone;
+    UConverter* fCnv;
+};
+
+// Converts with the cut, blank and terminator rules of the entry points.
 int Convert(bool toUtf8, UConverter* cnv, char* dst, int dstSize, const char* src, int srcLen,
             int* error) {
     int ignored;
     if (!error) error = &ignored;
     *error = 0;
-    ConverterPtr clone = cnv ? nullptr : CloneConverter(nullptr);
-    if (!cnv) cnv = clone.get();
-    if (!cnv) {
+    Conversion conversion(toUtf8, cnv);
+    if (!conversion.Converter()) {
         *error = 3;
         return 0;
     }
     if (!dst) dstSize = 0;
     bool terminate = srcLen < 0;
-    srcLen = static_cast<int>(TextLength(src, srcLen));
     int c = terminate && dstSize > 0 ? dstSize - 1 : std::max(dstSize, 0);
     UErrorCode err = U_ZERO_ERROR;
-    int n;
-    if (toUtf8) {
-        ucnv_resetToUnicode(cnv);
-        n = ucnv_toAlgorithmic(UCNV_UTF8, cnv, dst, c, src ? src : "", srcLen, &err);
-    } else {
-        ucnv_resetFromUnicode(cnv);
-        n = ucnv_fromAlgorithmic(cnv, UCNV_UTF8, dst, c, src ? src : "", srcLen, &err);
-    }
+    int n = conversion.Run(dst, c, src, srcLen, &err);
     *error = ErrorOf(err);
     if (U_FAILURE(err) && err != U_BUFFER_OVERFLOW_ERROR) n = 0;
     if (n > c) {
@@ -276,7 +297,7 @@ int Convert(bool toUtf8, UConverter* cnv, char* dst, int dstSize, const char* sr
         // neither the count nor the terminator ever goes past the buffer.
         n = 0;
         if (c > 0) {
-            CharCodec codec(cnv);
+            CharCodec codec(conversion.Converter());
             n = toUtf8 ? Utf8CutPoint(dst, c)
                        : static_cast<int>(CodecRun(codec, dst, strnlen(dst, c), true));
             memset(dst + n, ' ', c - n);
@@ -291,23 +312,13 @@ int Convert(bool toUtf8, UConverter* cnv, char* dst, int dstSize, const char* sr
 int ConvertedLength(bool toUtf8, UConverter* cnv, const char* src, int srcLen, int* error) {
     int ignored;
     if (!error) error = &ignored;
-    *error = 0;
-    ConverterPtr clone = cnv ? nullptr : CloneConverter(nullptr);
-    if (!cnv) cnv = clone.get();
-    if (!cnv) {
+    Conversion conversion(toUtf8, cnv);
+    if (!conversion.Converter()) {
         *error = 3;
         return 0;
     }
-    srcLen = static_cast<int>(TextLength(src, srcLen));
     UErrorCode err = U_ZERO_ERROR;
-    int n;
-    if (toUtf8) {
-        ucnv_resetToUnicode(cnv);
-        n = ucnv_toAlgorithmic(UCNV_UTF8, cnv, nullptr, 0, src ? src : "", srcLen, &err);
-    } else {
-        ucnv_resetFromUnicode(cnv);
-        n = ucnv_fromAlgorithmic(cnv, UCNV_UTF8, nullptr, 0, src ? src : "", srcLen, &err);
-    }
+    int n = conversion.Run(nullptr, 0, src, srcLen, &err);
     if (err == U_BUFFER_OVERFLOW_ERROR) err = U_ZERO_ERROR;
     *error = ErrorOf(err);
     return U_FAILURE(err) ? 0 : n;
@@ -389,7 +400,7 @@ void mbCopyPadded(char* dst, size_t size, const char* src, int srcLen) {
 }
 
 const char* mbFindLastChar(const char* text, UChar32 c) {
-    if (!text) return nullptr;
+    if (!text || c < 0) return nullptr;
     // Only UTF-8 keeps ASCII bytes out of its multibyte sequences; a
     // double-byte code page may use them as trail bytes.
     if (c >= 0 && c < 0x80 && mbIsUtf8Mode()) return strrchr(text, c);

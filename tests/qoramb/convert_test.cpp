@@ -46,6 +46,12 @@ TEST_F(Convert, CodePageToUtf8WithLengths) {
     EXPECT_EQ(fError, 0);
     EXPECT_EQ(mbCodePageToUtf8(cp1252.get(), nullptr, 0, src.get(), 2, &fError), 0);
     EXPECT_EQ(fError, 1);
+    // A given length converts every byte, a zero byte too.
+    char zero[8];
+    EXPECT_EQ(
+        mbCodePageToUtf8(cp1252.get(), zero, 8, std::string("a\0\xE9", 3).c_str(), 3, &fError), 4);
+    EXPECT_EQ(Bytes(zero, 5), std::string("a\0\xC3\xA9 ", 5));
+    EXPECT_EQ(mbCodePageToUtf8Length(cp1252.get(), "a\0b", 3, &fError), 3);
 }
 
 TEST_F(Convert, DoubleByteCodePage) {

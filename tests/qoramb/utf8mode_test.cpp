@@ -85,6 +85,9 @@ TEST_F(Utf8Mode, EqualAndCompareIgnoringCase) {
     EXPECT_EQ(mbEqualNoCase(cut.get(), 2, "A\xC3", -1, &error), 1);
     EXPECT_EQ(error, 3);
     EXPECT_EQ(mbEqualNoCase("\xC3\xA9", -1, "\xC3", -1, &error), 0);
+    // Malformed bytes stand for themselves: not folded as if they were Latin-1.
+    EXPECT_EQ(mbEqualNoCase("\xC9", -1, "\xE9", -1, &error), 0);
+    EXPECT_EQ(error, 3);
 
     EXPECT_EQ(mbCompareNoCase("abc", "ABD"), -1);
     EXPECT_EQ(mbCompareNoCase("ABC", "abc"), 0);
@@ -147,6 +150,7 @@ TEST_F(Utf8Mode, FindLastChar) {
     EXPECT_EQ(mbFindLastChar(accents, 0xE9), accents + 3);
     EXPECT_EQ(mbFindLastChar(accents, 0x4E2D), nullptr);
     EXPECT_EQ(mbFindLastChar(nullptr, 'a'), nullptr);
+    EXPECT_EQ(mbFindLastChar("a\xFF", -1), nullptr);
 }
 
 }  // namespace
