@@ -6,6 +6,7 @@
 #include "datasrc.h"
 #include "dserror.h"
 #include "qoramb.h"
+#include "specialvalues.h"
 
 CaseValue::CaseValue(QORA_InputCaseIterator& iterator, int index) : _index(index) {
     Refresh(iterator);

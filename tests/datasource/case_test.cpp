@@ -11,6 +11,7 @@
 #include "dserror.h"
 #include "memory_source.h"
 #include "qoramb.h"
+#include "specialvalues.h"
 
 namespace {
 

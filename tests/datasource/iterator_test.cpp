@@ -6,6 +6,7 @@
 
 #include "case.h"
 #include "memory_source.h"
+#include "specialvalues.h"
 
 namespace {
 
