@@ -26,7 +26,7 @@ build-asan: deps
 	cmake --build build-asan -j $(JOBS)
 
 run: build
-	./build/tools/qoradump examples/sample.qsf
+	./build/tools/qoradates
 
 test: build build-asan locales
 	cd build && ctest --output-on-failure -j $(JOBS)

@@ -1,0 +1,28 @@
+// The process-wide table of open files: a file handle is a slot index.
+#pragma once
+
+#include <array>
+#include <memory>
+
+#include "fileentry.h"
+
+class HandleTable {
+  public:
+    enum { kSlots = 100 };
+
+    // 0 with *entry set, 5 for a handle outside 0 to 99 or an empty slot,
+    // else the status of the entry's access check (*entry then stays null).
+    int Lookup(int handle, Access access, FileEntry** entry) const;
+    // Stores the entry in the lowest empty slot: 0 with *handle set, or 4
+    // when every slot is taken (the entry is then destroyed).
+    int Insert(std::unique_ptr<FileEntry> entry, int* handle);
+    // Empties the slot, then destroys its entry: 0, or 5 for a bad handle.
+    // The slot is free even when tearing the entry down fails.
+    int Close(int handle);
+
+  private:
+    std::array<std::unique_ptr<FileEntry>, kSlots> fSlots;
+};
+
+// The one table of the process, created when the library is loaded.
+HandleTable& TheHandleTable();
