@@ -4,12 +4,15 @@
 //
 // Texts are byte strings, zero-terminated unless a length is given; a length
 // of -1 means "up to the terminator". No routine reads past the length it is
-// given or past a terminator.
+// given or past a terminator. Cuts keep whole characters only: a character
+// that a length would split is dropped, while bytes that form no character at
+// all count as one-byte units and are kept.
 #pragma once
 
-#include <cstddef>
 #include <unicode/ucnv.h>
 #include <unicode/umachine.h>
+
+#include <cstddef>
 
 // The interface encoding flag: 0 code-page mode (the state at load), 1 UTF-8.
 int mbIsUtf8Mode();
@@ -18,16 +21,20 @@ void mbSetUtf8Mode(int flag);
 // code-page converter, so caches of converted text can tell they are stale.
 unsigned mbGeneration();
 
-// Byte length of the character at text; 0 for an empty text, -1 when the
-// bytes do not form a whole character within n bytes.
+// Byte length of the character at text; 0 for a null or empty text or n = 0,
+// -1 when the bytes do not form a whole character within n bytes.
 int mbCharLength(const char* text, size_t n);
 
-// Case mapping in place: never changes the byte length of the text; a shorter
-// result is padded with blanks.
+// Case mapping with ICU's simple mapping per character. A character whose
+// mapping the encoding cannot hold, or whose mapping takes more bytes, is
+// kept as it is, so a text never grows and never loses a character.
+// In place: the byte length never changes; a shorter result is blank-padded.
 void mbToUpperInPlace(char* text);
 void mbToLowerInPlace(char* text);
 // Case mapping into a separate destination of dstLen bytes; returns the
-// number of bytes written. A srcLen of -1 runs to the terminator.
+// number of bytes written, followed by a terminator when there is room.
+// error (may be null): 0, 1 when a character did not fit, 3 when the source
+// is malformed (malformed bytes are copied as they are).
 int mbToUpper(const char* src, int srcLen, char* dst, int dstLen, int* error);
 int mbToLower(const char* src, int srcLen, char* dst, int dstLen, int* error);
 
@@ -51,6 +58,10 @@ const char* mbFindLastChar(const char* text, UChar32 c);
 // Conversion between a code page (the converter's, or the current one when
 // cnv is null) and UTF-8, independent of the interface encoding. Returns the
 // number of bytes in the destination; error is 0, 1 (cut) or 3 (lossy).
+// A srcLen of -1 converts up to the terminator and terminates the result
+// within dstSize. With a given length no terminator is written: a cut result
+// is blank-filled to dstSize, a shorter one gets one blank after it. A cut
+// always falls between whole characters of the destination's encoding.
 int mbCodePageToUtf8(UConverter* cnv, char* dst, int dstSize, const char* src, int srcLen,
                      int* error);
 int mbUtf8ToCodePage(UConverter* cnv, char* dst, int dstSize, const char* src, int srcLen,

@@ -4,6 +4,8 @@
 #include <cstring>
 #include <ctime>
 
+#include "specialvalues.h"
+
 namespace {
 
 // The local time in seconds since 14 October 1582 (proleptic Gregorian).
@@ -23,6 +25,8 @@ double LocalTimeStamp() {
 }
 
 }  // namespace
+
+void CaseLayout::Reserve() { ReserveMore(fOffsets, 1); }
 
 void CaseLayout::Insert(size_t position, int32_t units) {
     QORA_ASSERT(position <= fOffsets.size());
@@ -128,7 +132,7 @@ void QORA_DataSource::InsertVariable(int varAfter, const QORA_Variable& var) {
     QORA_ASSERT(var.IsValid());
     // Everything that can fail happens before either list changes.
     QORA_Variable copy = var;
-    fData.fDictionary.reserve(fData.fDictionary.size() + 1);
+    ReserveMore(fData.fDictionary, 1);
     fData.fLayout.Reserve();
     fData.fLayout.Insert(varAfter, copy.ValueUnits());
     fData.fDictionary.insert(fData.fDictionary.begin() + varAfter, std::move(copy));

@@ -3,6 +3,7 @@
 // base class; subclasses add case delivery and their own file handling.
 #pragma once
 
+#include <algorithm>
 #include <cstddef>
 #include <cstdint>
 #include <optional>
@@ -16,6 +17,13 @@
 
 class QORA_InputCaseIterator;
 
+// Makes room for n more elements, growing geometrically, so that adding them
+// next cannot fail half done (and appending stays linear overall).
+template <class Vector>
+void ReserveMore(Vector& v, size_t n) {
+    if (v.capacity() - v.size() < n) v.reserve(std::max(2 * v.capacity(), v.size() + n));
+}
+
 // Where each variable's values start in a case, in 8-byte value units. Kept
 // in step with the dictionary by every append, insert, replace and delete.
 class CaseLayout {
@@ -28,7 +36,7 @@ class CaseLayout {
 
     // Makes room for one more variable, so that a following change cannot
     // fail half done.
-    void Reserve() { fOffsets.reserve(fOffsets.size() + 1); }
+    void Reserve();
     void Insert(size_t position, int32_t units);
     void Resize(size_t index, int32_t oldUnits, int32_t newUnits);
     // Removes the inclusive range start..finish.

@@ -32,7 +32,7 @@ QORA_Variable SlotDictionary::VariableAtOrNull(int slot) const {
 
 QORA_Variable& SlotDictionary::NewVariable(int type, int* index) {
     // Room first, so that a failure leaves the slots in step with the source.
-    fEntries.reserve(fEntries.size() + ValueUnits(type));
+    ReserveMore(fEntries, ValueUnits(type));
     QORA_Variable& var = fpSource->NewVariable(type, index);
     AddEntries(*index, type);
     return var;

@@ -6,6 +6,7 @@
 #include <cstring>
 
 #include "qoramb.h"
+#include "specialvalues.h"
 
 namespace {
 
@@ -49,16 +50,6 @@ bool AllBlanks(const unsigned char* p, size_t n) {
 }
 
 }  // namespace
-
-double SysmisValue() {
-    const uint64_t bits = 0xFFEFFFFFFFFFFFFFull;
-    return Number(&bits);
-}
-
-double HighestValue() {
-    const uint64_t bits = 0x7FEFFFFFFFFFFFFFull;
-    return Number(&bits);
-}
 
 uint32_t PackFormat(const QORA_Format& f) {
     const uint32_t low = f.width & 0xFF, high = (f.width >> 8) & 0xFF;

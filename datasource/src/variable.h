@@ -8,10 +8,6 @@
 
 #include "varimpl.h"
 
-// The special values, until the shared definitions are in place.
-double SysmisValue();
-double HighestValue();
-
 // A print or write format as (type code, width, decimals).
 struct QORA_Format {
     int code;
@@ -69,7 +65,7 @@ class QORA_Variable : public QORA_Variable_Enumerations {
     void SetPrintFormatWord(uint32_t word) { Edit().fPrintFormat = word; }
     void SetWriteFormatWord(uint32_t word) { Edit().fWriteFormat = word; }
 
-    // Null when the variable has no label.
+    // Null when the variable has no label; valid while a variable holds the label.
     const char* GetLabel() const;
     void SetLabel(const char* label);
     void SetLabel(const char* label, size_t length);
@@ -99,8 +95,9 @@ class QORA_Variable : public QORA_Variable_Enumerations {
     QORA_VLMap GetValueLabels() const;
     void SetValueLabels(const QORA_VLMap& labels);
 
+    // Changed by setting a changed copy: a reference into the shared object
+    // would outlive the next copy of the handle.
     const Attributes& GetAttributes() const { return Impl().fAttributes; }
-    Attributes& EditAttributes() { return Edit().fAttributes; }
     void SetAttributes(const Attributes& attributes);
 
     // Properties alike; the identity does not take part.

@@ -1,0 +1,292 @@
+#include "CompressedSystemFile.h"
+
+#include <cstring>
+#include <string>
+
+#include "dserror.h"
+#include "filestream.h"
+#include "sparsefileindex.h"
+
+namespace {
+
+constexpr uint64_t kSysmisBits = 0xFFEFFFFFFFFFFFFFull;
+constexpr uint64_t kBlankBits = 0x2020202020202020ull;
+
+// The 8 bytes each code stands for: code - 100 as a double, eight spaces for
+// 254, the system-missing value for 255.
+struct CodeTable {
+    unsigned char unit[256][8];
+    CodeTable() {
+        for (int k = 0; k < 256; ++k) {
+            const double value = k - CompressedSystemFile::kBias;
+            std::memcpy(unit[k], &value, 8);
+        }
+        std::memcpy(unit[CompressedSystemFile::kBlank], &kBlankBits, 8);
+        std::memcpy(unit[CompressedSystemFile::kSysmis], &kSysmisBits, 8);
+    }
+};
+const CodeTable kCodes;
+
+[[noreturn]] void TooShort(const char* condition, int line) {
+    throw SystemFileException(kErrTooShort, condition, __FILE__, line);
+}
+
+void Reverse(unsigned char* unit) {
+    uint64_t bits;
+    std::memcpy(&bits, unit, 8);
+    bits = __builtin_bswap64(bits);
+    std::memcpy(unit, &bits, 8);
+}
+
+}  // namespace
+
+CompressedSystemFile::CompressedSystemFile(uint32_t unitsPerCase, SparseFileIndex* index,
+                                           QORA_StrBaseIO* stream, int64_t dataStart)
+    : fDataStart(dataStart),
+      fIndex(index),
+      fStream(stream),
+      fFile(dynamic_cast<QORA_FileStream*>(stream)),
+      fUnits(unitsPerCase),
+      fAhead(new unsigned char[kReadAhead]) {
+    QORA_ASSERT(index != nullptr);
+    QORA_ASSERT(stream != nullptr);
+    fStream->Seek(fDataStart, 0);
+}
+
+CompressedSystemFile::~CompressedSystemFile() {
+    try {
+        Finish();
+    } catch (...) {
+        // Nothing may escape a destructor; the writer finishes explicitly.
+    }
+}
+
+unsigned char CompressedSystemFile::Encode(const unsigned char* unit) {
+    uint64_t bits;
+    std::memcpy(&bits, unit, 8);
+    if (bits == kSysmisBits) return kSysmis;
+    if (bits == kBlankBits) return kBlank;
+    const uint32_t low = static_cast<uint32_t>(bits);
+    const uint32_t high = static_cast<uint32_t>(bits >> 32);
+    const uint32_t exponent = high & 0x7FF00000u;
+    // Only 0.0 and whole numbers of magnitude 1 to 255 can have a code.
+    if (low != 0 || (high != 0 && (exponent < 0x3FF00000u || exponent > 0x40600000u))) {
+        return kRaw;
+    }
+    double value;
+    std::memcpy(&value, unit, 8);
+    const int k = static_cast<int>(value) + kBias;
+    if (k < 1 || k >= kEndOfBlock) return kRaw;
+    if (std::memcmp(kCodes.unit[k], unit, 8) != 0) return kRaw;
+    return static_cast<unsigned char>(k);
+}
+
+bool CompressedSystemFile::Fill(uint32_t need) {
+    unsigned char* ahead = fAhead.get();
+    const uint32_t have = fAheadEnd - fAheadBegin;
+    if (have >= need) return true;
+    std::memmove(ahead, ahead + fAheadBegin, have);
+    fAheadStart += fAheadBegin;
+    fAheadBegin = 0;
+    fAheadEnd = have;
+    while (fAheadEnd < need) {
+        const uint32_t got = fStream->Read(ahead + fAheadEnd, kReadAhead - fAheadEnd);
+        if (got == 0) break;
+        fAheadEnd += got;
+    }
+    return fAheadEnd >= need;
+}
+
+void CompressedSystemFile::DropReadAhead(int64_t position) {
+    if (fStream->Seek(fDataStart + position, 0) != 0) TooShort("nRead", __LINE__);
+    fAheadStart = position;
+    fAheadBegin = fAheadEnd = 0;
+}
+
+bool CompressedSystemFile::LoadBlock() {
+    if (!Fill(kKeySize)) {
+        if (fAheadEnd != fAheadBegin) TooShort("nRead == 0", __LINE__);
+        fAtEnd = true;
+        fPos = kKeySize;
+        fNextBlock = fAheadStart + fAheadBegin;
+        return false;
+    }
+    const unsigned char* control = fAhead.get() + fAheadBegin;
+    uint32_t raws = 0;
+    for (uint32_t i = 0; i < kKeySize && control[i] != kEndOfBlock; ++i) {
+        raws += control[i] == kRaw;
+    }
+    const uint32_t length = kKeySize + kUnitSize * raws;
+    if (!Fill(length)) TooShort("nRead == nu*sizeof(OBS)", __LINE__);
+    fControl = fAhead.get() + fAheadBegin;
+    fRawNext = fControl + kKeySize;
+    fBlockStart = fAheadStart + fAheadBegin;
+    fNextBlock = fBlockStart + length;
+    fAheadBegin += length;
+    fPos = 0;
+    fAtEnd = false;
+    return true;
+}
+
+template <bool kStore>
+uint32_t CompressedSystemFile::Decode(unsigned char* out, const unsigned char* swapMask) {
+    const uint32_t n = fUnits;
+    if (n == 0) return 0;
+    uint32_t cell = 0;
+    for (;;) {
+        if (fPos >= kKeySize && !LoadBlock()) {
+            if (cell == 0) return 0;
+            TooShort("iCell == 0", __LINE__);
+        }
+        const unsigned char* control = fControl;
+        const unsigned char* raw = fRawNext;
+        uint32_t pos = fPos;
+        while (pos < kKeySize) {
+            const unsigned char code = control[pos++];
+            if (code == kSkip) continue;
+            if (code == kEndOfBlock) {
+                pos = kKeySize;
+                break;
+            }
+            if (code == kRaw) {
+                if (kStore) {
+                    std::memcpy(out + kUnitSize * cell, raw, kUnitSize);
+                    if (swapMask && swapMask[cell] == 1) Reverse(out + kUnitSize * cell);
+                }
+                raw += kUnitSize;
+            } else if (kStore) {
+                std::memcpy(out + kUnitSize * cell, kCodes.unit[code], kUnitSize);
+            }
+            if (++cell == n) {
+                fPos = pos;
+                fRawNext = raw;
+                return n;
+            }
+        }
+        fPos = pos;
+        fRawNext = raw;
+    }
+}
+
+void CompressedSystemFile::Seek(int64_t position) {
+    QORA_ASSERT(position >= 0);
+    const uint32_t r = static_cast<uint32_t>(position % kKeySize);
+    const int64_t start = position - r;
+    if (start >= fAheadStart && start <= fAheadStart + fAheadEnd) {
+        fAheadBegin = static_cast<uint32_t>(start - fAheadStart);
+    } else {
+        DropReadAhead(start);
+    }
+    fAtEnd = false;
+    fPos = kKeySize;
+    fNextBlock = start;
+    // A block boundary is loaded when it is needed, so the end of the data
+    // is a position like any other.
+    if (r == 0) return;
+    if (!LoadBlock()) TooShort("nRead", __LINE__);
+    for (uint32_t i = 0; i < r; ++i) {
+        if (fControl[i] == kEndOfBlock) {
+            fPos = kKeySize;
+            return;
+        }
+        if (fControl[i] == kRaw) fRawNext += kUnitSize;
+    }
+    fPos = r;
+}
+
+void CompressedSystemFile::Position() {
+    if (fRequested == fCurrent) return;
+    if (fRequested == fCurrent - 1) {
+        Seek(fLastCaseStart);
+        fCurrent = fRequested;
+        return;
+    }
+    SparseFileIndex::Entry found = fIndex->Lookup(fRequested);
+    Seek(found.position);
+    int64_t caseNumber = found.caseNumber;
+    while (caseNumber < fRequested) {
+        const int64_t start = Tell();
+        if (Decode<false>(nullptr, nullptr) == 0) break;
+        fIndex->Offer(caseNumber, start);
+        fLastCaseStart = start;
+        ++caseNumber;
+    }
+    fCurrent = fRequested = caseNumber;
+}
+
+uint32_t CompressedSystemFile::ReadCase(void* units, const unsigned char* swapMask) {
+    Position();
+    if (fAtEnd) return 0;
+    const int64_t start = Tell();
+    fIndex->Offer(fCurrent, start);
+    fLastCaseStart = start;
+    ++fRequested;
+    ++fCurrent;
+    const uint32_t n = Decode<true>(static_cast<unsigned char*>(units), swapMask);
+    // At the end the stream still stands before the case it could not read.
+    if (n == 0) {
+        --fRequested;
+        --fCurrent;
+    }
+    return n;
+}
+
+void CompressedSystemFile::WriteBlock() {
+    const uint32_t length = kKeySize + kUnitSize * fRawCount;
+    if (fStream->Seek(fDataStart + fBlockStart, 0) != 0 ||
+        fStream->Write(fBlock, length) != length) {
+        RaiseError(kErrStreamWrite, "compressed case data");
+    }
+    fNextBlock = fBlockStart + length;
+    fAheadStart = fNextBlock;
+    fAheadBegin = fAheadEnd = 0;
+}
+
+void CompressedSystemFile::WriteCase(const void* units) {
+    fIndex->Offer(fCurrent, Tell());
+    const unsigned char* unit = static_cast<const unsigned char*>(units);
+    for (uint32_t u = 0; u < fUnits; ++u, unit += kUnitSize) {
+        if (fPos >= kKeySize) {
+            fBlockStart = fNextBlock;
+            fPos = 0;
+            fRawCount = 0;
+        }
+        const unsigned char code = Encode(unit);
+        fBlock[fPos++] = code;
+        if (code == kRaw) std::memcpy(fBlock + kKeySize + kUnitSize * fRawCount++, unit, kUnitSize);
+        if (fPos == kKeySize) WriteBlock();
+    }
+    ++fCurrent;
+    fWritten = true;
+}
+
+void CompressedSystemFile::Finish() {
+    if (!fWritten) return;
+    if (fPos < kKeySize) {
+        std::memset(fBlock + fPos, kSkip, kKeySize - fPos);
+        WriteBlock();
+    }
+    if (fFile) fFile->Flush();
+    fWritten = false;
+}
+
+void CompressedSystemFile::PrepareAppend(int64_t casesInFile) {
+    fRequested = casesInFile;
+    Position();
+    const int64_t position = Tell();
+    if (fFile) {
+        fFile->Commit();
+        const char* name = fFile->Name();
+        if (!name || !fFile->Open(name, "r+b")) {
+            throw SystemFileException(kErrCannotOpen, "m_->_file.Open(m_->_file.Name(), \"r+b\")",
+                                      __FILE__, __LINE__);
+        }
+    }
+    // A partly filled last block is carried over: the next case overwrites
+    // its padding and the whole block is written again.
+    if (fPos < kKeySize) {
+        fRawCount = static_cast<uint32_t>(fRawNext - (fControl + kKeySize)) / kUnitSize;
+        std::memcpy(fBlock, fControl, kKeySize + kUnitSize * fRawCount);
+    }
+    DropReadAhead(position - position % kKeySize);
+}

@@ -1,0 +1,197 @@
+#include "valuelabelmap.h"
+
+#include <algorithm>
+#include <cmath>
+#include <cstring>
+
+#include "qoramb.h"
+
+namespace {
+
+// One 8-byte unit as stored: a little-endian double, whatever the host.
+double UnitValue(const std::string& key, size_t unit) {
+    uint64_t bits = 0;
+    for (int i = 7; i >= 0; --i) bits = (bits << 8) | static_cast<unsigned char>(key[8 * unit + i]);
+    double value;
+    std::memcpy(&value, &bits, sizeof value);
+    return value;
+}
+
+int64_t UnitBits(double value) {
+    int64_t bits;
+    std::memcpy(&bits, &value, sizeof bits);
+    return bits;
+}
+
+std::string UnitBytes(double value) {
+    uint64_t bits;
+    std::memcpy(&bits, &value, sizeof bits);
+    std::string key(8, '\0');
+    for (int i = 0; i < 8; ++i) key[i] = static_cast<char>(bits >> (8 * i));
+    return key;
+}
+
+// Numeric order, made total so that a binary search can rely on it: values
+// that compare equal as numbers (0 and -0) are told apart by their bits,
+// negative zero first, and NaNs (string chunks can look like one) come after
+// every number.
+int CompareUnits(double a, double b) {
+    bool nanA = std::isnan(a), nanB = std::isnan(b);
+    if (!nanA && !nanB) {
+        if (a < b) return -1;
+        if (b < a) return 1;
+    } else if (nanA != nanB) {
+        return nanA ? 1 : -1;
+    }
+    int64_t bitsA = UnitBits(a), bitsB = UnitBits(b);
+    return bitsA < bitsB ? -1 : bitsA > bitsB ? 1 : 0;
+}
+
+}  // namespace
+
+QORA_VLMapImpl::QORA_VLMapImpl(int32_t keyType) : fKeyType(keyType) {
+    QORA_ASSERT(IsValidKeyType(keyType));
+}
+
+// Keys of different lengths (after a change of key type) are compared over
+// their common units, the shorter first when those agree.
+int QORA_VLMapImpl::CompareKeys(const std::string& a, const std::string& b) {
+    size_t units = std::min(a.size(), b.size()) / 8;
+    for (size_t u = 0; u < units; ++u) {
+        int c = CompareUnits(UnitValue(a, u), UnitValue(b, u));
+        if (c != 0) return c;
+    }
+    return a.size() < b.size() ? -1 : a.size() > b.size() ? 1 : 0;
+}
+
+void QORA_VLMapImpl::SetKeyType(int32_t keyType) {
+    QORA_ASSERT(IsValidKeyType(keyType));
+    fKeyType = keyType;
+}
+
+std::vector<QORA_VLMapImpl::Pair>::const_iterator QORA_VLMapImpl::LowerBound(
+    const std::string& key) const {
+    return std::lower_bound(fPairs.begin(), fPairs.end(), key,
+                            [](const Pair& pair, const std::string& probe) {
+                                return CompareKeys(pair.key, probe) < 0;
+                            });
+}
+
+void QORA_VLMapImpl::Insert(std::string key, std::string label) {
+    auto it = LowerBound(key);
+    if (it != fPairs.end() && it->key == key) {
+        fPairs[it - fPairs.begin()].label = std::move(label);
+    } else {
+        fPairs.insert(it, Pair{std::move(key), std::move(label)});
+    }
+}
+
+const std::string* QORA_VLMapImpl::Lookup(const std::string& key) const {
+    auto it = LowerBound(key);
+    return it != fPairs.end() && it->key == key ? &it->label : nullptr;
+}
+
+QORA_VLMap::QORA_VLMap(int32_t keyType) : fpImpl(new QORA_VLMapImpl(keyType)) {}
+
+int32_t QORA_VLMap::KeyType() const { return fpImpl.IsValid() ? fpImpl->KeyType() : 0; }
+
+void QORA_VLMap::SetKeyType(int32_t keyType) {
+    if (Count() > 0) {
+        fpImpl.Mutable()->SetKeyType(keyType);
+    } else {
+        fpImpl.Reset(new QORA_VLMapImpl(keyType));
+    }
+}
+
+int QORA_VLMap::Count() const {
+    return fpImpl.IsValid() ? static_cast<int>(fpImpl->Pairs().size()) : 0;
+}
+
+void QORA_VLMap::Insert(const void* units, const std::string& label) {
+    QORA_ASSERT(IsValid());
+    QORA_ASSERT(units != nullptr);
+    fpImpl.Mutable()->Insert(std::string(static_cast<const char*>(units), fpImpl->KeyBytes()),
+                             label);
+}
+
+void QORA_VLMap::Insert(double value, const std::string& label) {
+    QORA_ASSERT(IsValid());
+    fpImpl.Mutable()->Insert(UnitBytes(value), label);
+}
+
+void QORA_VLMap::Insert(const char* text, int length, const std::string& label) {
+    QORA_ASSERT(IsValid());
+    fpImpl.Mutable()->Insert(KeyFromText(text, length), label);
+}
+
+const std::string* QORA_VLMap::Lookup(const void* units) const {
+    if (!IsValid() || units == nullptr) return nullptr;
+    return fpImpl->Lookup(std::string(static_cast<const char*>(units), fpImpl->KeyBytes()));
+}
+
+const std::string* QORA_VLMap::Lookup(double value) const {
+    return IsValid() ? fpImpl->Lookup(UnitBytes(value)) : nullptr;
+}
+
+const std::string* QORA_VLMap::Lookup(const char* text, int length) const {
+    return IsValid() ? fpImpl->Lookup(KeyFromText(text, length)) : nullptr;
+}
+
+std::string QORA_VLMap::KeyFromText(const char* text, int length) const {
+    std::string key(fpImpl->KeyBytes(), ' ');
+    if (text == nullptr) return key;
+    if (length < 0) length = static_cast<int>(std::strlen(text));
+    mbCopyPadded(key.data(), key.size(), text, length);
+    return key;
+}
+
+void QORA_VLMap::Reset() { fIter = 0; }
+
+bool QORA_VLMap::End() const {
+    QORA_ASSERT(fIter && "Reset() missing");
+    return !IsValid() || *fIter >= fpImpl->Pairs().size();
+}
+
+// The pair under the cursor, and the cursor moved past it; null at the end.
+const QORA_VLMapImpl::Pair* QORA_VLMap::Step() {
+    if (!IsValid()) return nullptr;
+    if (End()) return nullptr;
+    return &fpImpl->Pairs()[(*fIter)++];
+}
+
+int QORA_VLMap::Next(std::string& units, std::string& label) {
+    const QORA_VLMapImpl::Pair* pair = Step();
+    if (!pair) return 0;
+    units = pair->key;
+    label = pair->label;
+    return 1;
+}
+
+int QORA_VLMap::NextNumber(double& value, std::string& label) {
+    const QORA_VLMapImpl::Pair* pair = Step();
+    if (!pair) return 0;
+    value = pair->key.size() >= 8 ? UnitValue(pair->key, 0) : 0.0;
+    label = pair->label;
+    return 1;
+}
+
+// A key stored before the key type grew is padded with blanks to the new width.
+int QORA_VLMap::NextText(std::string& text, std::string& label) {
+    const QORA_VLMapImpl::Pair* pair = Step();
+    if (!pair) return 0;
+    text = pair->key;
+    text.resize(fpImpl->KeyType(), ' ');
+    label = pair->label;
+    return 1;
+}
+
+bool QORA_VLMap::operator==(const QORA_VLMap& other) const {
+    if (SameObject(other)) return true;
+    if (!IsValid() || !other.IsValid()) return false;
+    const auto& a = fpImpl->Pairs();
+    const auto& b = other.fpImpl->Pairs();
+    return a.size() == b.size() &&
+           std::equal(a.begin(), a.end(), b.begin(), [](const auto& x, const auto& y) {
+               return x.key == y.key && x.label == y.label;
+           });
+}

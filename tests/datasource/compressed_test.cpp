@@ -1,0 +1,368 @@
+#include <gtest/gtest.h>
+#include <unistd.h>
+
+#include <cmath>
+#include <cstring>
+#include <fstream>
+#include <limits>
+#include <random>
+#include <string>
+#include <vector>
+
+#include "CompressedSystemFile.h"
+#include "dserror.h"
+#include "filestream.h"
+#include "inmemfile.h"
+#include "sparsefileindex.h"
+
+namespace {
+
+using Bytes = std::vector<unsigned char>;
+using Unit = std::array<unsigned char, 8>;
+
+const int64_t kHeader = 16;  // bytes before the case data in every test file
+
+Unit Num(double d) {
+    Unit u;
+    std::memcpy(u.data(), &d, 8);
+    return u;
+}
+Unit Str(const char* s8) {
+    Unit u;
+    std::memcpy(u.data(), s8, 8);
+    return u;
+}
+Unit Sysmis() {
+    const uint64_t bits = 0xFFEFFFFFFFFFFFFFull;
+    Unit u;
+    std::memcpy(u.data(), &bits, 8);
+    return u;
+}
+void Append(Bytes& out, const Unit& u) { out.insert(out.end(), u.begin(), u.end()); }
+
+// An in-memory file holding a header of kHeader bytes and then the data.
+struct MemFile {
+    explicit MemFile(const Bytes& data = {}) {
+        const Bytes header(kHeader, 'h');
+        file.Write(header.data(), kHeader);
+        if (!data.empty()) file.Write(data.data(), static_cast<uint32_t>(data.size()));
+    }
+    Bytes Data() const { return Bytes(file.Data() + kHeader, file.Data() + file.Size()); }
+    QORA_InMemoryFile file;
+    SparseFileIndex index;
+};
+
+Bytes Encode(uint32_t units, const std::vector<std::vector<Unit>>& cases) {
+    MemFile m;
+    CompressedSystemFile c(units, &m.index, &m.file, kHeader);
+    for (const auto& one : cases) c.WriteCase(one.data());
+    c.Finish();
+    return m.Data();
+}
+
+std::vector<std::vector<Unit>> DecodeAll(uint32_t units, const Bytes& data) {
+    MemFile m(data);
+    CompressedSystemFile c(units, &m.index, &m.file, kHeader);
+    std::vector<std::vector<Unit>> cases;
+    std::vector<Unit> one(units);
+    while (c.ReadCase(one.data(), nullptr) == units) cases.push_back(one);
+    return cases;
+}
+
+// Decodes until the end and returns the condition of the error raised.
+std::string DecodeError(uint32_t units, const Bytes& data) {
+    try {
+        DecodeAll(units, data);
+    } catch (const SystemFileException& e) {
+        EXPECT_EQ(kErrTooShort, e.Number());
+        return e.Condition();
+    }
+    return "";
+}
+
+TEST(CompressedCodes, EncoderTable) {
+    EXPECT_EQ(100, CompressedSystemFile::Encode(Num(0.0).data()));
+    EXPECT_EQ(1, CompressedSystemFile::Encode(Num(-99.0).data()));
+    EXPECT_EQ(251, CompressedSystemFile::Encode(Num(151.0).data()));
+    EXPECT_EQ(200, CompressedSystemFile::Encode(Num(100.0).data()));
+    EXPECT_EQ(101, CompressedSystemFile::Encode(Num(1.0).data()));
+    EXPECT_EQ(255, CompressedSystemFile::Encode(Sysmis().data()));
+    EXPECT_EQ(254, CompressedSystemFile::Encode(Str("        ").data()));
+    for (double raw :
+         {0.5, -0.0, -100.0, 152.0, 255.0, 1.0000001, -1.5, 1e300,
+          std::numeric_limits<double>::infinity(), std::numeric_limits<double>::quiet_NaN()}) {
+        EXPECT_EQ(253, CompressedSystemFile::Encode(Num(raw).data())) << raw;
+    }
+    EXPECT_EQ(253, CompressedSystemFile::Encode(Str("ABCDEFGH").data()));
+}
+
+TEST(CompressedWrite, DocumentedExampleByteByByte) {
+    const Bytes data = Encode(4, {{Num(1), Num(2), Num(3), Str("ABCDEFGH")}});
+    Bytes expect = {101, 102, 103, 253, 0, 0, 0, 0};
+    Append(expect, Str("ABCDEFGH"));
+    EXPECT_EQ(expect, data);
+}
+
+TEST(CompressedWrite, NineCellsMakeOneFullBlockAndOnePadded) {
+    std::vector<std::vector<Unit>> cases(9, {Num(1.0)});
+    const Bytes data = Encode(1, cases);
+    const Bytes expect = {101, 101, 101, 101, 101, 101, 101, 101, 101, 0, 0, 0, 0, 0, 0, 0};
+    EXPECT_EQ(expect, data);
+    EXPECT_EQ(cases, DecodeAll(1, data));
+}
+
+TEST(CompressedWrite, NothingWrittenWritesNothing) { EXPECT_TRUE(Encode(3, {}).empty()); }
+
+TEST(CompressedRoundTrip, MixedCasesDecodeToTheSameBytes) {
+    std::mt19937 rng(7);
+    const Unit pool[] = {Num(0),    Num(-99), Num(151),        Num(0.5),        Num(-0.0),
+                         Num(1e10), Sysmis(), Str("        "), Str("abcdefgh"), Num(42)};
+    for (uint32_t units : {1u, 3u, 8u, 13u}) {
+        std::vector<std::vector<Unit>> cases(50, std::vector<Unit>(units));
+        for (auto& one : cases) {
+            for (auto& u : one) u = pool[rng() % 10];
+        }
+        EXPECT_EQ(cases, DecodeAll(units, Encode(units, cases))) << units;
+    }
+}
+
+TEST(CompressedRead, PaddedLastBlockEndsCleanlyAndStaysAtEnd) {
+    MemFile m({101, 102, 103, 0, 0, 0, 0, 0});
+    CompressedSystemFile c(1, &m.index, &m.file, kHeader);
+    Unit u;
+    for (double want : {1.0, 2.0, 3.0}) {
+        ASSERT_EQ(1u, c.ReadCase(u.data(), nullptr));
+        EXPECT_EQ(Num(want), u);
+    }
+    EXPECT_EQ(0u, c.ReadCase(u.data(), nullptr));
+    EXPECT_TRUE(c.AtEnd());
+    EXPECT_EQ(3, c.CurrentCase());
+    EXPECT_EQ(0u, c.ReadCase(u.data(), nullptr));
+}
+
+TEST(CompressedRead, Code252SkipsTheRestOfItsBlock) {
+    // 252 at the start, in the middle and at the end of blocks; the codes
+    // after it (253 among them) have no raw values.
+    Bytes data = {101, 252, 253, 253, 102, 102, 102, 102};
+    const Bytes second = {252, 253, 253, 253, 253, 253, 253, 253};
+    data.insert(data.end(), second.begin(), second.end());
+    const Bytes third = {103, 253, 104, 105, 106, 107, 108, 252};
+    data.insert(data.end(), third.begin(), third.end());
+    Append(data, Num(0.25));
+    const auto cases = DecodeAll(1, data);
+    const std::vector<std::vector<Unit>> expect = {{Num(1)}, {Num(3)}, {Num(0.25)}, {Num(4)},
+                                                   {Num(5)}, {Num(6)}, {Num(7)},    {Num(8)}};
+    EXPECT_EQ(expect, cases);
+}
+
+TEST(CompressedRead, AllZeroBlocksEndWithoutCases) {
+    EXPECT_TRUE(DecodeAll(2, Bytes(64, 0)).empty());
+    EXPECT_TRUE(DecodeAll(2, Bytes(64, 252)).empty());
+}
+
+TEST(CompressedRead, MalformedDataRaiseTooShort) {
+    // The data stop after 3 of a case's 5 cells.
+    EXPECT_EQ("iCell == 0", DecodeError(5, {101, 102, 103, 0, 0, 0, 0, 0}));
+    EXPECT_EQ("iCell == 0", DecodeError(5, {101, 102, 103, 252, 101, 101, 101, 101}));
+    // Control bytes cut short, at the start and after whole cases.
+    EXPECT_EQ("nRead == 0", DecodeError(1, {101, 102, 103}));
+    EXPECT_EQ("nRead == 0", DecodeError(1, {101, 101, 101, 101, 101, 101, 101, 101, 101}));
+    // Raw values cut short: two announced, one and a half present.
+    Bytes raws = {253, 253, 0, 0, 0, 0, 0, 0};
+    Append(raws, Num(0.5));
+    raws.insert(raws.end(), 4, 0);
+    EXPECT_EQ("nRead == nu*sizeof(OBS)", DecodeError(1, raws));
+}
+
+TEST(CompressedRead, RandomBytesNeverCrashOrHang) {
+    std::mt19937 rng(11);
+    for (int round = 0; round < 2000; ++round) {
+        Bytes data(rng() % 200);
+        for (auto& b : data) {
+            // Favour the control codes so blocks and raws are exercised.
+            const unsigned pick = rng() % 8;
+            b = pick < 6 ? static_cast<unsigned char>(250 + pick)
+                         : static_cast<unsigned char>(rng());
+        }
+        const uint32_t units = 1 + rng() % 9;
+        try {
+            DecodeAll(units, data);
+        } catch (const SystemFileException& e) {
+            EXPECT_EQ(kErrTooShort, e.Number());
+        }
+    }
+}
+
+TEST(CompressedRead, SwapMaskReversesRawCellsOnly) {
+    Bytes data = {253, 105, 253, 0, 0, 0, 0, 0};
+    Unit big = Num(1234.5);
+    std::reverse(big.begin(), big.end());
+    Append(data, big);
+    Append(data, Str("ABCDEFGH"));
+    MemFile m(data);
+    CompressedSystemFile c(3, &m.index, &m.file, kHeader);
+    const unsigned char mask[3] = {1, 1, 0};
+    std::vector<Unit> out(3);
+    ASSERT_EQ(3u, c.ReadCase(out.data(), mask));
+    EXPECT_EQ(Num(1234.5), out[0]);
+    EXPECT_EQ(Num(5), out[1]);
+    EXPECT_EQ(Str("ABCDEFGH"), out[2]);
+}
+
+// Cases of 3 units whose raw values land all over the blocks.
+std::vector<std::vector<Unit>> Numbered(int count) {
+    std::vector<std::vector<Unit>> cases;
+    for (int i = 0; i < count; ++i) {
+        cases.push_back({Num(i), Num(i + 0.5), Num(i % 3 ? 1 : 0.75)});
+    }
+    return cases;
+}
+
+TEST(CompressedPosition, TellAndSeekReturnToEveryCase) {
+    const auto cases = Numbered(40);
+    MemFile m(Encode(3, cases));
+    CompressedSystemFile c(3, &m.index, &m.file, kHeader);
+    std::vector<int64_t> starts;
+    std::vector<Unit> out(3);
+    for (size_t i = 0; i < cases.size(); ++i) {
+        starts.push_back(c.Tell());
+        ASSERT_EQ(3u, c.ReadCase(out.data(), nullptr));
+    }
+    // 120 cells fill 15 blocks: after the last case no block is loaded and
+    // the position names where a next block would start.
+    EXPECT_EQ(static_cast<int64_t>(m.Data().size()), c.Tell());
+    for (size_t i = cases.size(); i-- > 0;) {
+        c.Seek(starts[i]);
+        EXPECT_EQ(starts[i], c.Tell());
+        ASSERT_EQ(3u, c.ReadCase(out.data(), nullptr));
+        EXPECT_EQ(cases[i], out) << i;
+    }
+    // The end of the data is a position too: reading there finds no case.
+    c.Seek(static_cast<int64_t>(m.Data().size()));
+    EXPECT_EQ(0u, c.ReadCase(out.data(), nullptr));
+}
+
+TEST(CompressedPosition, SeekWhereNoBlockIsRaises) {
+    MemFile m({101, 0, 0, 0, 0, 0, 0, 0});
+    CompressedSystemFile c(1, &m.index, &m.file, kHeader);
+    try {
+        c.Seek(11);
+        FAIL();
+    } catch (const SystemFileException& e) {
+        EXPECT_EQ(kErrTooShort, e.Number());
+        EXPECT_EQ("nRead", e.Condition());
+    }
+    EXPECT_THROW(c.Seek(64), SystemFileException);  // beyond the in-memory data
+}
+
+TEST(CompressedPosition, RequestedCasesInAnyOrder) {
+    const auto cases = Numbered(3000);
+    MemFile m(Encode(3, cases));
+    CompressedSystemFile c(3, &m.index, &m.file, kHeader);
+    std::vector<Unit> out(3);
+    for (int64_t want : {5, 2, 2, 1, 2999, 1500, 0, 1499, 1500, 1501, 7, 2000}) {
+        c.SetRequestedCase(want);
+        ASSERT_EQ(3u, c.ReadCase(out.data(), nullptr)) << want;
+        EXPECT_EQ(cases[want], out) << want;
+        EXPECT_EQ(want + 1, c.CurrentCase());
+    }
+    EXPECT_GT(m.index.Count(), 0u);
+    // Beyond the end: positioning stops at the end of the data.
+    c.SetRequestedCase(100000);
+    EXPECT_EQ(0u, c.ReadCase(out.data(), nullptr));
+    EXPECT_EQ(3000, c.CurrentCase());
+    c.SetRequestedCase(2999);
+    ASSERT_EQ(3u, c.ReadCase(out.data(), nullptr));
+    EXPECT_EQ(cases[2999], out);
+}
+
+TEST(CompressedAppend, ContinuesThePaddedLastBlockInMemory) {
+    MemFile m({101, 102, 103, 0, 0, 0, 0, 0});
+    {
+        CompressedSystemFile c(1, &m.index, &m.file, kHeader);
+        c.PrepareAppend(3);
+        EXPECT_EQ(3, c.Tell());
+        const Unit u = Num(4);
+        c.WriteCase(u.data());
+    }
+    const Bytes expect = {101, 102, 103, 104, 0, 0, 0, 0};
+    EXPECT_EQ(expect, m.Data());
+}
+
+TEST(CompressedAppend, KeepsRawValuesAndFillsIntoNewBlocks) {
+    const auto first = Numbered(5);  // 15 cells: the last block is partly used
+    MemFile m(Encode(3, first));
+    {
+        CompressedSystemFile c(3, &m.index, &m.file, kHeader);
+        c.PrepareAppend(5);
+        for (const auto& one : Numbered(9)) c.WriteCase(one.data());
+        c.Finish();
+    }
+    auto expect = first;
+    for (const auto& one : Numbered(9)) expect.push_back(one);
+    EXPECT_EQ(expect, DecodeAll(3, m.Data()));
+    // The same bytes as writing all cases in one go.
+    EXPECT_EQ(Encode(3, expect), m.Data());
+}
+
+class CompressedFileTest : public ::testing::Test {
+  protected:
+    void SetUp() override {
+        fPath = ::testing::TempDir() + "qoracomp_" + std::to_string(::getpid()) + "_" +
+                ::testing::UnitTest::GetInstance()->current_test_info()->name();
+    }
+    void TearDown() override { std::remove(fPath.c_str()); }
+    Bytes Data() const {
+        std::ifstream in(fPath, std::ios::binary);
+        Bytes all((std::istreambuf_iterator<char>(in)), {});
+        return Bytes(all.begin() + kHeader, all.end());
+    }
+    std::string fPath;
+};
+
+TEST_F(CompressedFileTest, WriteThenAppendThroughReopenedFile) {
+    SparseFileIndex index;
+    {
+        QORA_FileStream out(fPath.c_str(), "wb");
+        out.Write(std::string(kHeader, 'h').data(), kHeader);
+        CompressedSystemFile c(1, &index, &out, kHeader);
+        for (double v : {1.0, 2.0, 3.0}) {
+            const Unit u = Num(v);
+            c.WriteCase(u.data());
+        }
+    }
+    EXPECT_EQ(Bytes({101, 102, 103, 0, 0, 0, 0, 0}), Data());
+    {
+        SparseFileIndex appendIndex;
+        QORA_FileStream file(fPath.c_str(), "rb");
+        CompressedSystemFile c(1, &appendIndex, &file, kHeader);
+        c.PrepareAppend(3);
+        for (double v : {4.0, 0.5}) {
+            const Unit u = Num(v);
+            c.WriteCase(u.data());
+        }
+        c.Finish();
+    }
+    Bytes expect = {101, 102, 103, 104, 253, 0, 0, 0};
+    Append(expect, Num(0.5));
+    EXPECT_EQ(expect, Data());
+}
+
+TEST_F(CompressedFileTest, AppendFailsWhenTheFileCannotBeReopened) {
+    { QORA_FileStream out(fPath.c_str(), "wb"); }
+    SparseFileIndex index;
+    QORA_FileStream file(fPath.c_str(), "rb");
+    CompressedSystemFile c(1, &index, &file, 0);
+    std::remove(fPath.c_str());
+    ::mkdir(fPath.c_str(), 0700);  // the name now belongs to a directory
+    try {
+        c.PrepareAppend(0);
+        FAIL();
+    } catch (const SystemFileException& e) {
+        EXPECT_EQ(kErrCannotOpen, e.Number());
+        EXPECT_EQ("m_->_file.Open(m_->_file.Name(), \"r+b\")", e.Condition());
+    }
+    ::rmdir(fPath.c_str());
+}
+
+}  // namespace

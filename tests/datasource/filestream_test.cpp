@@ -1,0 +1,280 @@
+#include "filestream.h"
+
+#include <gtest/gtest.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
+#include <cstdio>
+#include <cstring>
+#include <fstream>
+#include <functional>
+#include <memory>
+#include <string>
+#include <vector>
+
+#include "dserror.h"
+#include "qoramb.h"
+
+namespace {
+
+class FileStreamTest : public ::testing::Test {
+  protected:
+    void SetUp() override {
+        mbSetUtf8Mode(1);
+        fDir = ::testing::TempDir() + "qorafs_" + std::to_string(::getpid()) + "_" +
+               ::testing::UnitTest::GetInstance()->current_test_info()->name();
+        ::mkdir(fDir.c_str(), 0700);
+    }
+    void TearDown() override { std::system(("rm -rf '" + fDir + "'").c_str()); }
+
+    std::string Path(const char* leaf) const { return fDir + "/" + leaf; }
+
+    static std::vector<char> Pattern(size_t n, int seed = 0) {
+        std::vector<char> bytes(n);
+        for (size_t i = 0; i < n; ++i) bytes[i] = static_cast<char>((i * 7 + seed) % 251);
+        return bytes;
+    }
+    static void Put(const std::string& path, const std::vector<char>& bytes) {
+        std::ofstream(path, std::ios::binary).write(bytes.data(), bytes.size());
+    }
+    static std::vector<char> Get(const std::string& path) {
+        std::ifstream in(path, std::ios::binary);
+        return std::vector<char>(std::istreambuf_iterator<char>(in), {});
+    }
+    static bool Exists(const std::string& path) { return ::access(path.c_str(), F_OK) == 0; }
+    // Changes bytes of the file behind the stream's back, so a test can tell
+    // buffered bytes (old) from bytes read again from the device (new).
+    static void Overwrite(const std::string& path, long at, const std::vector<char>& bytes) {
+        std::fstream f(path, std::ios::binary | std::ios::in | std::ios::out);
+        f.seekp(at);
+        f.write(bytes.data(), bytes.size());
+    }
+
+    std::string fDir;
+};
+
+TEST_F(FileStreamTest, ShortFileReadTwice) {
+    Put(Path("three"), {'a', 'b', 'c'});
+    QORA_FileStream s(Path("three").c_str(), "rb");
+    char buf[10];
+    EXPECT_EQ(3u, s.Read(buf, 10));
+    EXPECT_EQ(0, std::memcmp(buf, "abc", 3));
+    EXPECT_FALSE(s.AtEnd());
+    EXPECT_EQ(0u, s.Read(buf, 10));
+    EXPECT_FALSE(s.AtEnd());  // the block at 0 was read again: not empty
+    EXPECT_EQ(3, s.Tell());
+}
+
+TEST_F(FileStreamTest, AtEndOnlyWhenBlockStartsAtEnd) {
+    Put(Path("f"), Pattern(512));
+    QORA_FileStream s(Path("f").c_str(), "rb");
+    char buf[16];
+    s.Seek(512, 0);
+    EXPECT_EQ(0u, s.Read(buf, 16));
+    EXPECT_TRUE(s.AtEnd());
+    s.Seek(0, 0);
+    EXPECT_FALSE(s.AtEnd());
+    EXPECT_EQ(16u, s.Read(buf, 16));
+}
+
+TEST_F(FileStreamTest, LargeReadGoesDirectToBlockBoundaryThenBuffers) {
+    const std::vector<char> old = Pattern(10000);
+    Put(Path("f"), old);
+    QORA_FileStream s(Path("f").c_str(), "rb");
+    std::vector<char> buf(5000);
+    s.Seek(100, 0);
+    ASSERT_EQ(5000u, s.Read(buf.data(), 5000));
+    EXPECT_EQ(0, std::memcmp(buf.data(), old.data() + 100, 5000));
+    EXPECT_EQ(5100, s.Tell());
+
+    Overwrite(Path("f"), 0, Pattern(10000, 1));
+    char b[8];
+    // 4608 onwards came through the buffer (4096 bytes from 4608): still old.
+    s.Seek(4608, 0);
+    ASSERT_EQ(8u, s.Read(b, 8));
+    EXPECT_EQ(0, std::memcmp(b, old.data() + 4608, 8));
+    s.Seek(8690, 0);
+    ASSERT_EQ(8u, s.Read(b, 8));
+    EXPECT_EQ(0, std::memcmp(b, old.data() + 8690, 8));
+    // Below 4608 the bytes went straight to the caller: read again, new.
+    s.Seek(4600, 0);
+    ASSERT_EQ(8u, s.Read(b, 8));
+    EXPECT_EQ(0, std::memcmp(b, Pattern(10000, 1).data() + 4600, 8));
+}
+
+TEST_F(FileStreamTest, SmallWritesStayBufferedUntilFlush) {
+    QORA_FileStream s(Path("w").c_str(), "wb");
+    const std::vector<char> data = Pattern(100);
+    EXPECT_EQ(100u, s.Write(data.data(), 100));
+    s.Seek(10, 0);
+    EXPECT_EQ(5u, s.Write("ABCDE", 5));
+    EXPECT_EQ(15, s.Tell());
+    EXPECT_TRUE(Get(Path("w")).empty());
+    // Seek from the end counts the buffered bytes past the device's end.
+    s.Seek(0, 2);
+    EXPECT_EQ(100, s.Tell());
+    EXPECT_TRUE(s.Flush());
+    std::vector<char> expect = data;
+    std::memcpy(expect.data() + 10, "ABCDE", 5);
+    EXPECT_EQ(expect, Get(Path("w")));
+}
+
+TEST_F(FileStreamTest, WriteReadBackMixedSizes) {
+    std::vector<char> expect;
+    {
+        QORA_FileStream s(Path("m").c_str(), "w+b");
+        for (size_t n : {3u, 4093u, 1u, 9000u, 4096u, 200u, 4095u, 5000u}) {
+            const std::vector<char> part = Pattern(n, static_cast<int>(n));
+            ASSERT_EQ(n, s.Write(part.data(), static_cast<uint32_t>(n)));
+            expect.insert(expect.end(), part.begin(), part.end());
+        }
+        // Rewrite inside data already on the device, then read everything back.
+        s.Seek(4000, 0);
+        s.Write("xyz", 3);
+        std::memcpy(expect.data() + 4000, "xyz", 3);
+        s.Seek(0, 0);
+        std::vector<char> back(expect.size() + 10);
+        EXPECT_EQ(expect.size(), s.Read(back.data(), static_cast<uint32_t>(back.size())));
+        back.resize(expect.size());
+        EXPECT_EQ(expect, back);
+    }
+    EXPECT_EQ(expect, Get(Path("m")));
+}
+
+TEST_F(FileStreamTest, AppendModeStartsAtEnd) {
+    Put(Path("a"), Pattern(700));
+    {
+        QORA_FileStream s(Path("a").c_str(), "ab");
+        EXPECT_EQ(700, s.Tell());
+        s.Write("end", 3);
+    }
+    std::vector<char> expect = Pattern(700);
+    expect.insert(expect.end(), {'e', 'n', 'd'});
+    EXPECT_EQ(expect, Get(Path("a")));
+}
+
+TEST_F(FileStreamTest, CopiesKeepTheirOwnPosition) {
+    Put(Path("c"), Pattern(9000));
+    auto original = std::make_unique<QORA_FileStream>(Path("c").c_str(), "rb");
+    QORA_FileStream copy(*original);
+    EXPECT_EQ(0, copy.Tell());
+    char a[4], b[4];
+    original->Seek(8000, 0);
+    ASSERT_EQ(4u, original->Read(a, 4));
+    ASSERT_EQ(4u, copy.Read(b, 4));
+    EXPECT_EQ(0, std::memcmp(a, Pattern(9000).data() + 8000, 4));
+    EXPECT_EQ(0, std::memcmp(b, Pattern(9000).data(), 4));
+    EXPECT_STREQ(original->Name(), copy.Name());
+    original.reset();
+    ASSERT_EQ(4u, copy.Read(b, 4));
+    EXPECT_EQ(0, std::memcmp(b, Pattern(9000).data() + 4, 4));
+}
+
+TEST_F(FileStreamTest, DeleteWhenClosed) {
+    {
+        QORA_FileStream s(Path("d1").c_str(), "w+D");
+        s.Write("x", 1);
+    }
+    EXPECT_FALSE(Exists(Path("d1")));
+
+    auto original = std::make_unique<QORA_FileStream>(Path("d2").c_str(), "w+bD");
+    original->Write("y", 1);
+    original->Flush();
+    auto copy = std::make_unique<QORA_FileStream>(*original);
+    original.reset();
+    EXPECT_TRUE(Exists(Path("d2")));  // the copy still shares the name
+    copy.reset();
+    EXPECT_FALSE(Exists(Path("d2")));
+}
+
+TEST_F(FileStreamTest, ReopenByOwnNameAndNonAsciiName) {
+    const std::string name = Path("d\xC3\xA4ta.bin");
+    QORA_FileStream s(name.c_str(), "wb");
+    EXPECT_STREQ(name.c_str(), s.Name());
+    s.Write("abc", 3);
+    // Reopening by the stream's own name writes out the buffer first.
+    ASSERT_TRUE(s.Open(s.Name(), "r+b"));
+    EXPECT_STREQ(name.c_str(), s.Name());
+    char buf[3];
+    EXPECT_EQ(3u, s.Read(buf, 3));
+    EXPECT_EQ(0, std::memcmp(buf, "abc", 3));
+    EXPECT_TRUE(Exists(name));
+}
+
+TEST_F(FileStreamTest, ClosedStreamAnswersQuietly) {
+    QORA_FileStream s;
+    char buf[4];
+    EXPECT_EQ(nullptr, s.Name());
+    EXPECT_EQ(0u, s.Read(buf, 4));
+    EXPECT_EQ(0u, s.Write(buf, 4));
+    EXPECT_EQ(-1, s.Seek(0, 0));
+    EXPECT_FALSE(s.Commit());
+    EXPECT_FALSE(s.Open(Path("missing").c_str(), "rb"));
+    EXPECT_FALSE(s.IsGood());
+    EXPECT_EQ(0, s.Tell());
+}
+
+TEST_F(FileStreamTest, NegativePositionReadsNothing) {
+    Put(Path("n"), Pattern(10));
+    QORA_FileStream s(Path("n").c_str(), "rb");
+    char buf[4];
+    EXPECT_EQ(0, s.Seek(-5, 0));
+    EXPECT_EQ(0u, s.Read(buf, 4));
+    EXPECT_TRUE(s.IsGood());
+}
+
+void ExpectError(long number, const std::function<void()>& action) {
+    try {
+        action();
+        ADD_FAILURE() << "no error " << number;
+    } catch (const ErrorText& e) {
+        EXPECT_NE(std::string::npos, e.Text().find("Datasource error # " + std::to_string(number)))
+            << e.Text();
+    }
+}
+
+TEST_F(FileStreamTest, FailuresRaiseStreamErrors) {
+    ExpectError(kErrStreamOpen, [&] { QORA_FileStream s(Path("missing").c_str(), "rb"); });
+
+    Put(Path("ro"), Pattern(10));
+    QORA_FileStream readOnly(Path("ro").c_str(), "rb");
+    std::vector<char> big = Pattern(5000);
+    ExpectError(kErrStreamWrite, [&] { readOnly.Write(big.data(), 5000); });
+    EXPECT_FALSE(readOnly.IsGood());
+    readOnly.ClearError();
+    EXPECT_TRUE(readOnly.IsGood());
+    readOnly.Seek(0, 0);
+    readOnly.Write("x", 1);  // buffered: the failure shows at the flush
+    ExpectError(kErrStreamWrite, [&] { readOnly.Flush(); });
+
+    QORA_FileStream writeOnly(Path("wo").c_str(), "wb");
+    char buf[4];
+    ExpectError(kErrStreamRead, [&] { writeOnly.Read(buf, 4); });
+    EXPECT_FALSE(writeOnly.IsGood());
+
+    QORA_FileStream negative(Path("neg").c_str(), "wb");
+    negative.Seek(-1, 0);
+    ExpectError(kErrStreamWrite, [&] { negative.Write("x", 1); });
+}
+
+TEST_F(FileStreamTest, PositionsBeyondFourGigabytes) {
+    const int64_t at = int64_t{5} << 30;
+    try {
+        QORA_FileStream s(Path("big").c_str(), "w+b");
+        s.Seek(at, 0);
+        s.Write("large", 5);
+        s.Flush();
+    } catch (const ErrorText& e) {
+        GTEST_SKIP() << "the file system refuses a sparse 5 GB file: " << e.Text();
+    }
+    QORA_FileStream s(Path("big").c_str(), "rb");
+    ASSERT_EQ(0, s.Seek(0, 2));
+    EXPECT_EQ(at + 5, s.Tell());
+    s.Seek(at - 3, 0);
+    char buf[16];
+    ASSERT_EQ(8u, s.Read(buf, 16));
+    EXPECT_EQ(0, std::memcmp(buf, "\0\0\0large", 8));
+    EXPECT_EQ(at + 5, s.Tell());
+}
+
+}  // namespace
