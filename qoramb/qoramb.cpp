@@ -147,7 +147,7 @@ size_t WholeRun(const char* text, size_t n, Step step) {
 
 size_t CodecRun(CharCodec& codec, const char* text, size_t n, bool stopAtMalformed) {
     return WholeRun(text, n, [&](const char* p, size_t k) {
-        UChar32 cp;
+        UChar32 cp = -1;
         int length = codec.Next(p, k, &cp);
         return cp < 0 && stopAtMalformed ? 0 : length;
     });
