@@ -1,0 +1,81 @@
+// The data source behind every system file: its reading side (the opening
+// factory, the dictionary reader and what the file said) and the empty
+// source that a file opened for writing starts from.
+#pragma once
+
+#include <cstdint>
+#include <memory>
+#include <string>
+
+#include "HeaderSettings.h"
+#include "datasrc.h"
+#include "filestream.h"
+
+// A data source that keeps its cases in a file of its own.
+class IndependentDataStore : public QORA_DataSource {
+  public:
+    using QORA_DataSource::QORA_DataSource;
+    // Takes effect when the dictionary is written.
+    virtual void SetCompression(bool on) = 0;
+};
+
+// Receives the warnings of the opening factory.
+class WarningSink {
+  public:
+    virtual ~WarningSink() = default;
+    virtual void Warning(long number, const std::string& text) = 0;
+};
+
+class SystemFileDataSource : public IndependentDataStore {
+  public:
+    enum State { kNothingYet = 0, kWriting = 1, kReading = 2 };
+
+    // An empty source for a file that is to be written.
+    SystemFileDataSource();
+    // Opens the file (name in the interface encoding) and reads its whole
+    // dictionary. A file that cannot be opened raises internal error 1201, a
+    // malformed one 1204 or 1205; the error carries the file name and nests
+    // the SystemFileException with the failed condition.
+    explicit SystemFileDataSource(const char* fileName);
+    ~SystemFileDataSource() override;
+
+    // The case iterator joins with case reading.
+    QORA_InputCaseIterator* NewIterator(void* buffer) override;
+    int64_t CaseCount() const override { return fSettings.fCaseCount; }
+    void SetCompression(bool on) override { fSettings.fCompressed = on; }
+
+    // What the file said.
+    // Whether a type 7 record of the subtype was read (subtype 0: documents).
+    virtual bool HasExtensionRecord(int subtype) const { return fSettings.HasSeen(subtype); }
+    // The release numbers; true only when the integer information record was read.
+    virtual bool GetReleaseInfo(int* major, int* minor, int* revision) const;
+    virtual bool IsSwapped() const { return fSettings.fSwapped; }
+    virtual double FileSystemMissing() const { return fSettings.fSysmis; }
+    // The current stream position is where the case-count record's data start.
+    virtual void NoteCaseCountRecord() { fCaseCountRecordPos = fStream.Tell(); }
+
+    const HeaderSettings& Settings() const { return fSettings; }
+    HeaderSettings& Settings() { return fSettings; }
+    State GetState() const { return fState; }
+    int64_t DataStart() const { return fDataStart; }
+    // 0 when the file has no case-count record.
+    int64_t CaseCountRecordPosition() const { return fCaseCountRecordPos; }
+
+  private:
+    // Header, dictionary records and the repairs, up to the case data.
+    void Read();
+
+    State fState = kNothingYet;
+    HeaderSettings fSettings;
+    QORA_FileStream fStream;
+    int64_t fDataStart = 0;
+    int64_t fCaseCountRecordPos = 0;
+};
+
+// Opens a system file for reading. The name is in the interface encoding;
+// warnings go to the sink when one is given.
+std::unique_ptr<QORA_DataSource> OpenForReading(const char* fileName, WarningSink* warnings);
+
+// Gives every variable whose name is not a valid name, or repeats an earlier
+// one, a new name v1, v2, ... that no other variable has.
+void RepairNames(QORA_DataSource& source);

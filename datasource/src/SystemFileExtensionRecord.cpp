@@ -1,0 +1,75 @@
+#include "SystemFileExtensionRecord.h"
+
+#include <cstring>
+#include <string>
+#include <vector>
+
+#include "HeaderSettings.h"
+#include "datasrc.h"
+
+void SystemFileExtensionRecord::SetUnitSize(int32_t unitSize) {
+    QORA_ASSERT(m_pContents == 0);
+    m_unitSize = unitSize;
+}
+
+void SystemFileExtensionRecord::SetNUnits(int32_t nUnits) {
+    QORA_ASSERT(m_pContents == 0);
+    m_nUnits = nUnits;
+}
+
+unsigned char* SystemFileExtensionRecord::Contents() {
+    if (!m_pContents) {
+        QORA_ASSERT(m_nUnits > 0 && m_unitSize > 0);
+        m_pContents.reset(new unsigned char[ByteCount()]);
+    }
+    return m_pContents.get();
+}
+
+void SystemFileExtensionRecord::SetContents(const void* data) {
+    std::memcpy(Contents(), data, ByteCount());
+}
+
+namespace {
+
+// Created by the first registration, at load; read-only afterwards.
+std::vector<SystemFileExtensionHandler*>& Registry() {
+    static std::vector<SystemFileExtensionHandler*> registry;
+    return registry;
+}
+
+}  // namespace
+
+void RegisterExtensionHandler(int32_t subtype, SystemFileExtensionHandler& handler) {
+    QORA_ASSERT(0 <= subtype);
+    auto& registry = Registry();
+    if (registry.size() <= size_t(subtype)) registry.resize(size_t(subtype) + 1, nullptr);
+    registry[subtype] = &handler;
+}
+
+SystemFileExtensionHandler* FindExtensionHandler(int32_t subtype) {
+    const auto& registry = Registry();
+    return subtype >= 0 && size_t(subtype) < registry.size() ? registry[subtype] : nullptr;
+}
+
+void ExportExtension(int32_t subtype, QORA_DataSource& source, SystemFileExtensionRecord& record) {
+    if (SystemFileExtensionHandler* handler = FindExtensionHandler(subtype)) {
+        handler->Export(source, record);
+        return;
+    }
+    if (!source.HasExtension(subtype)) return;
+    const QORA_ExtensionImpl* stored = source.GetExtension(subtype).Impl();
+    record.SetUnitSize(stored->ElementSize());
+    record.SetNUnits(stored->ElementCount());
+    if (!record.IsEmpty()) record.SetContents(stored->Content().data());
+}
+
+void ImportExtension(int32_t subtype, QORA_DataSource& source, HeaderSettings& settings,
+                     const SystemFileExtensionRecord& record) {
+    if (SystemFileExtensionHandler* handler = FindExtensionHandler(subtype))
+        handler->Import(source, settings, record);
+    else if (!record.IsEmpty())
+        source.ImportExtension(
+            subtype, record.UnitSize(),
+            std::string(reinterpret_cast<const char*>(record.Contents()), record.ByteCount()));
+    settings.NoteSeen(subtype);
+}
