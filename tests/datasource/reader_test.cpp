@@ -41,6 +41,7 @@ TEST_P(Reader, EndRecordAloneGivesAnEmptyDictionary) {
     EXPECT_EQ(source->DataStart(), 176 + 8);
     EXPECT_EQ(source->IsSwapped(), Swapped());
     EXPECT_EQ(source->NewIterator(nullptr), nullptr);
+    EXPECT_EQ(source->FileSystemMissing(), kSysmis);
 }
 
 TEST_P(Reader, HeaderFieldsReachTheSettingsAndTheSource) {
