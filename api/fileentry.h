@@ -28,8 +28,6 @@ struct ValueSlot {
 using NameIndex = std::map<std::string, int32_t>;
 
 struct FileEntry {
-    enum { kExtensionSlots = 41 };  // one per extension record subtype 0 to 40
-
     FileEntry(std::unique_ptr<QORA_DataSource> dataSource, OpenMode mode);
 
     // 0 when the entry meets the requirement, else the status code.

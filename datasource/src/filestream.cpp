@@ -52,7 +52,7 @@ void FileName::Set(const char* text) {
     _cached = false;
 }
 
-const char* FileName::InInterfaceEncoding() {
+const char* FileName::InInterfaceEncoding() const {
     if (mbIsUtf8Mode()) return _utf8.c_str();
     if (!_cached || _generation != mbGeneration()) {
         _codePage = ConvertName(mbUtf8ToCodePage, _utf8.c_str(), 2 * _utf8.size() + 4);
@@ -62,7 +62,7 @@ const char* FileName::InInterfaceEncoding() {
     return _codePage.c_str();
 }
 
-QORA_FileStream::QORA_FileStream() : fData(new Data) { fData->name = std::make_shared<FileName>(); }
+QORA_FileStream::QORA_FileStream() : fData(new Data) { fData->name.Reset(new FileName); }
 
 QORA_FileStream::QORA_FileStream(const char* name, const char* mode) : QORA_FileStream() {
     if (!Open(name, mode)) {
@@ -85,7 +85,7 @@ QORA_FileStream::~QORA_FileStream() {
         // Nothing may escape a destructor; callers that need to know flush first.
     }
     Close();
-    if (fData->deleteWhenClosed && fData->name.use_count() == 1) {
+    if (fData->deleteWhenClosed && fData->name->RefCount() == 1) {
         qora::FileRemove(fData->name->Utf8().c_str());
     }
 }
@@ -99,7 +99,7 @@ int64_t QORA_FileStream::Tell() const { return fPos; }
 bool QORA_FileStream::AtEnd() const { return fData->atEnd; }
 
 const char* QORA_FileStream::Name() const {
-    if (!fData->name || fData->name->Utf8().empty()) return nullptr;
+    if (!fData->name.IsValid() || fData->name->Utf8().empty()) return nullptr;
     return fData->name->InInterfaceEncoding();
 }
 
@@ -107,14 +107,13 @@ bool QORA_FileStream::Open(const char* name, const char* mode) {
     // The name may be this stream's own (reopening by Name()), so it is taken
     // before the name record changes.
     const std::string text(name ? name : "");
-    if (fData->name.use_count() > 1) fData->name = std::make_shared<FileName>();
-    fData->name->Set(text.c_str());
+    fData->name.Mutable()->Set(text.c_str());
     fData->deleteWhenClosed = false;
     return OpenNamed(mode);
 }
 
 bool QORA_FileStream::Open(const Data::FileName& name, const char* mode) {
-    fData->name = std::make_shared<FileName>(name);
+    fData->name.Reset(new FileName(name));
     fData->deleteWhenClosed = false;
     return OpenNamed(mode);
 }

@@ -5,6 +5,7 @@
 #include <memory>
 #include <string>
 
+#include "refcnt.h"
 #include "strbaseio.h"
 
 class QORA_FileStream : public QORA_StrBaseIO {
@@ -15,29 +16,29 @@ class QORA_FileStream : public QORA_StrBaseIO {
     struct Data {
         // The name of a file, kept in UTF-8 (the form used to open it) and,
         // on demand, in the caller's code page.
-        class FileName {
+        class FileName : public QORA_RefCntObject {
           public:
             // Takes a name in the interface encoding.
             void Set(const char* text);
             const std::string& Utf8() const { return _utf8; }
             // The name in the interface encoding, converted again when the
             // interface encoding has changed since the last call.
-            const char* InInterfaceEncoding();
+            const char* InInterfaceEncoding() const;
 
           private:
             std::string _utf8;
-            std::string _codePage;
-            unsigned _generation = 0;
-            bool _cached = false;
+            // A cache of the UTF-8 name, valid for one interface encoding.
+            mutable std::string _codePage;
+            mutable unsigned _generation = 0;
+            mutable bool _cached = false;
         };
-        using NamePtr = std::shared_ptr<FileName>;
 
         char buffer[kBufferSize];
         char* fillEnd = buffer;
         int64_t bufferPos = -1;
         int64_t devicePos = 0;
         int fd = -1;
-        NamePtr name;
+        QORA_CowRef<FileName> name;
         bool deleteWhenClosed = false;
         bool written = false;
         bool good = false;

@@ -1,5 +1,8 @@
-// A thin table of (case number, compressed position) pairs, so a compressed
-// file can be positioned at any case without decoding it from the start.
+// Where cases start in compressed case data: a small table of (case number,
+// position) pairs, positions counted from the start of the data. It grows as
+// cases are read or written and thins itself, so its size grows with the
+// square root of the data size. Shared by the iterators and the writer of one
+// data source.
 #pragma once
 
 #include <cstddef>
@@ -13,20 +16,34 @@ class SparseFileIndex {
         int64_t position;
     };
 
-    // The last recorded entry at or before caseNumber; (0, 0) when none.
+    enum : uint32_t {
+        kInitialSpacing = 4096,
+        // The table holds fewer than spacing / kBytesPerEntry entries: reaching
+        // that many halves it and doubles the spacing.
+        kBytesPerEntry = 16,
+    };
+
+    // unit multiplies the spacing; precondition unit >= 1.
+    explicit SparseFileIndex(uint32_t unit = 1);
+
+    // The last recorded case start at or before caseNumber; (0, 0), the start
+    // of the data, when none is recorded.
     Entry Lookup(int64_t caseNumber);
-    // Offers the compressed position of a case; kept only when it lies far
-    // enough beyond the last one.
+    // A case start met while reading or writing; recorded when it lies far
+    // enough beyond the latest one.
     void Offer(int64_t caseNumber, int64_t position);
 
-    size_t Count() const { return _entries.size(); }
-    int64_t Spacing() const { return _spacing; }
+    size_t Count() const { return fEntries.size(); }
+    const Entry& At(size_t k) const { return fEntries[k]; }
+    uint32_t Spacing() const { return fSpacing; }
+    int64_t LastPosition() const { return fLastPosition; }
 
   private:
-    enum : int64_t { kUnit = 1, kInitialSpacing = 4096, kEntryCost = 16 };
+    void Thin();
 
-    std::vector<Entry> _entries;
-    int64_t _lastPosition = -1;
-    int32_t _cursor = -1;
-    int64_t _spacing = kEntryCost * kUnit < 4096 ? kInitialSpacing / kUnit : kEntryCost;
+    std::vector<Entry> fEntries;
+    int64_t fLastPosition = -1;
+    int32_t fCursor = -1;
+    uint32_t fSpacing;
+    uint32_t fUnit;
 };

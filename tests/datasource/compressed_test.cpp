@@ -366,3 +366,22 @@ TEST_F(CompressedFileTest, AppendFailsWhenTheFileCannotBeReopened) {
 }
 
 }  // namespace
+
+namespace {
+
+TEST(SparseIndex, KeepsOneEntryPerSpacingAndThins) {
+    SparseFileIndex index;
+    EXPECT_EQ(0, index.Lookup(5).caseNumber);
+    for (int64_t i = 0; i <= 300; ++i) index.Offer(i, i * 4096);
+    // 256 entries reached 4096 / 16: halved to the even cases, spacing doubled.
+    EXPECT_EQ(8192, index.Spacing());
+    EXPECT_EQ(151u, index.Count());
+    EXPECT_EQ(254, index.Lookup(255).caseNumber);
+    EXPECT_EQ(256 * 4096, index.Lookup(257).position);
+    EXPECT_EQ(300, index.Lookup(100000).caseNumber);
+    // Positions not beyond the last one are ignored.
+    index.Offer(301, 4096);
+    EXPECT_EQ(300, index.Lookup(301).caseNumber);
+}
+
+}  // namespace

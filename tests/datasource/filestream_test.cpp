@@ -20,12 +20,16 @@ namespace {
 class FileStreamTest : public ::testing::Test {
   protected:
     void SetUp() override {
+        fWasUtf8 = mbIsUtf8Mode();
         mbSetUtf8Mode(1);
         fDir = ::testing::TempDir() + "qorafs_" + std::to_string(::getpid()) + "_" +
                ::testing::UnitTest::GetInstance()->current_test_info()->name();
         ::mkdir(fDir.c_str(), 0700);
     }
-    void TearDown() override { std::system(("rm -rf '" + fDir + "'").c_str()); }
+    void TearDown() override {
+        std::system(("rm -rf '" + fDir + "'").c_str());
+        mbSetUtf8Mode(fWasUtf8);
+    }
 
     std::string Path(const char* leaf) const { return fDir + "/" + leaf; }
 
@@ -51,6 +55,7 @@ class FileStreamTest : public ::testing::Test {
     }
 
     std::string fDir;
+    int fWasUtf8 = 0;
 };
 
 TEST_F(FileStreamTest, ShortFileReadTwice) {
@@ -198,6 +203,18 @@ TEST_F(FileStreamTest, ReopenByOwnNameAndNonAsciiName) {
     char buf[3];
     EXPECT_EQ(3u, s.Read(buf, 3));
     EXPECT_EQ(0, std::memcmp(buf, "abc", 3));
+    EXPECT_TRUE(Exists(name));
+}
+
+TEST_F(FileStreamTest, NameFollowsTheInterfaceEncoding) {
+    const std::string name = Path("plain.bin");
+    mbSetUtf8Mode(0);
+    QORA_FileStream s(name.c_str(), "wb");
+    EXPECT_STREQ(name.c_str(), s.Name());
+    mbSetUtf8Mode(1);
+    EXPECT_STREQ(name.c_str(), s.Name());
+    mbSetUtf8Mode(0);
+    EXPECT_STREQ(name.c_str(), s.Name());
     EXPECT_TRUE(Exists(name));
 }
 
