@@ -37,8 +37,7 @@ Bytes RichFile(Endian endian, bool compressed) {
     b.VeryLongStrings();
     b.CaseCount64(3);
     b.FileAttributes(SysFileBuilder::AttributeText({{"Origin", {"seed"}}}));
-    b.VariableAttributes(
-        {{"NUM", SysFileBuilder::AttributeText({{"Unit", {"cm", "mm"}}})}});
+    b.VariableAttributes({{"NUM", SysFileBuilder::AttributeText({{"Unit", {"cm", "mm"}}})}});
     b.LongValueLabelsRecord({{"MEDIUM", 20, {{"first", "The first value"}}}});
     b.MultipleResponseSets({SysFileBuilder::CategorySetLine("$SET", "A set", {"NUM", "RANGE"})});
     b.VariableSets({SysFileBuilder::VariableSetLine("Numbers", {"NUM", "RANGE", "LOW"})});
@@ -76,8 +75,9 @@ int main(int argc, char** argv) {
     bool ok = Write(dir + "/sample.qsf", SampleFile());
     for (Endian endian : {Endian::Native, Endian::Swapped}) {
         for (bool compressed : {false, true}) {
-            const std::string suffix = std::string(endian == Endian::Native ? "native" : "swapped") +
-                                       (compressed ? "-compressed" : "-raw") + ".qsf";
+            const std::string suffix =
+                std::string(endian == Endian::Native ? "native" : "swapped") +
+                (compressed ? "-compressed" : "-raw") + ".qsf";
             ok = Write(dir + "/rich-" + suffix, RichFile(endian, compressed)) && ok;
             ok = Write(dir + "/plain-" + suffix, PlainFile(endian, compressed)) && ok;
         }
