@@ -6,6 +6,8 @@
 #include <string>
 #include <vector>
 
+#include "qoramb.h"
+
 namespace {
 
 class TestSource : public QORA_DataSource {
@@ -161,6 +163,16 @@ TEST(DataSourceTest, FindVariableIgnoresCaseAndTrailingBlanks) {
     EXPECT_EQ(ds.FindVariable(" age"), -1);
     EXPECT_EQ(ds.FindVariable("ag"), -1);
     EXPECT_EQ(ds.FindVariable("agexyz", 3), 0);
+}
+
+TEST(DataSourceTest, FindVariableUpperCasesWholeCharacters) {
+    mbSetUtf8Mode(1);
+    TestSource ds;
+    AddVariables(ds, {0});
+    ds.GetVariable(0).SetName("caf\xC3\xA9");
+    EXPECT_EQ(ds.GetVariable(0).GetKey(), "CAF\xC3\x89");
+    EXPECT_EQ(ds.FindVariable("CAF\xC3\x89 "), 0);
+    mbSetUtf8Mode(0);
 }
 
 TEST(DataSourceTest, IndexOfIDFollowsTheVariable) {
