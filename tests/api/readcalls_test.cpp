@@ -215,6 +215,25 @@ TEST(AccessChecks, DefineCallsOnReadHandlesGiveEight) {
     EXPECT_EQ(qoraCloseAppend(handle), QORA_STATUS_OK);
 }
 
+// Any negative count means unknown: none is passed on as a number of cases,
+// and counts beyond 32 bits are unknown too.
+TEST(CountCalls, NegativeAndHugeCaseCountsAreMinusOne) {
+    struct CountedSource : MemorySource {
+        explicit CountedSource(int64_t cases) : fCases(cases) {}
+        int64_t CaseCount() const override { return fCases; }
+        int64_t fCases;
+    };
+    for (int64_t cases : {-4294967295LL, -5LL, 2147483648LL, 2147483647LL}) {
+        int handle = -1;
+        auto entry = std::make_unique<FileEntry>(std::make_unique<CountedSource>(cases), ReadMode);
+        ASSERT_EQ(TheHandleTable().Insert(std::move(entry), &handle), QORA_STATUS_OK);
+        OpenHandle h(handle);
+        int count = 7;
+        EXPECT_EQ(qoraGetNumberofCases(h.get(), &count), QORA_STATUS_OK);
+        EXPECT_EQ(count, cases == 2147483647LL ? 2147483647 : -1) << cases;
+    }
+}
+
 // The name index and the system file view, on entries over sources made in
 // memory.
 TEST(FileEntryTables, DuplicateKeysAreRefusedAndNamesFoundIgnoringCaseAndBlanks) {
