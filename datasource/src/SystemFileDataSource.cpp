@@ -13,6 +13,7 @@
 #include "SystemFileExtensionRecord.h"
 #include "dictnry.h"
 #include "qoramb.h"
+#include "variableset.h"
 
 // A condition the file must meet, with the text the failure reports.
 #define SF_CHECK(number, cond, text) \
@@ -310,6 +311,33 @@ void LowerCaseNames(QORA_DataSource& source) {
     }
 }
 
+const QORA_SetFamily kSetFamilies[] = {QORA_SetFamily::kVariableSets,
+                                       QORA_SetFamily::kMultipleResponse};
+
+// Sets may name variables the file does not have: those names go, and the
+// records of a family that lost any are written again from what is left.
+void PruneStoredSets(QORA_DataSource& source) {
+    for (QORA_SetFamily family : kSetFamilies) {
+        QORA_VariableSetList sets = LoadVariableSets(source, family);
+        if (!PruneVariableSets(sets, source)) continue;
+        if (family == QORA_SetFamily::kVariableSets) {
+            source.SetExtensionContent(kVariableSetExtension, 1, 0, nullptr);
+        } else {
+            source.SetExtensionContent(kMultRespExtension, 1, 0, nullptr);
+            source.SetExtensionContent(kExtendedMultRespExtension, 1, 0, nullptr);
+        }
+        StoreVariableSets(source, sets);
+    }
+}
+
+// After the names changed their case, the sets are written again.
+void RestoreSets(QORA_DataSource& source) {
+    for (QORA_SetFamily family : kSetFamilies) {
+        const QORA_VariableSetList sets = LoadVariableSets(source, family);
+        if (!sets.empty()) StoreVariableSets(source, sets);
+    }
+}
+
 }  // namespace
 
 void RepairNames(QORA_DataSource& source) {
@@ -352,9 +380,12 @@ void SystemFileDataSource::Read() {
     DictionaryReader reader(*this, fStream);
     reader.ReadHeader();
     reader.ReadRecords();
-    // The multiple response and variable sets join here.
+    PruneStoredSets(*this);
     RepairNames(*this);
-    if (!fSettings.fLongNamesSeen) LowerCaseNames(*this);
+    if (!fSettings.fLongNamesSeen) {
+        LowerCaseNames(*this);
+        RestoreSets(*this);
+    }
     fState = kReading;
     fDataStart = fStream.Tell();
 }

@@ -177,7 +177,7 @@ TEST_P(MalformedReader, CorruptedBytesNeverEscapeTheChecks) {
     const SysFileBuilder b = Full();
     const Bytes whole = b.Build();
     for (size_t at = 0; at < b.DataStart(); ++at) {
-        for (uint8_t value : {uint8_t(0x00), uint8_t(0x7F), uint8_t(0xFF)}) {
+        for (uint8_t value : {uint8_t(0x80), uint8_t(0xFF)}) {
             Bytes bytes = whole;
             bytes[at] = value;
             const OpenFailure f = FailureOf(b.WriteTemp(bytes, "bad.qsf"));

@@ -7,6 +7,7 @@
 #include <vector>
 
 #include "reader_support.h"
+#include "variableset.h"
 
 using namespace fixture;
 
@@ -41,6 +42,7 @@ TEST_P(Reader, EndRecordAloneGivesAnEmptyDictionary) {
     EXPECT_EQ(source->DataStart(), 176 + 8);
     EXPECT_EQ(source->IsSwapped(), Swapped());
     EXPECT_EQ(source->NewIterator(nullptr), nullptr);
+    EXPECT_EQ(source->FileSystemMissing(), kSysmis);
 }
 
 TEST_P(Reader, HeaderFieldsReachTheSettingsAndTheSource) {
@@ -304,4 +306,23 @@ TEST_P(Reader, ThousandVariablesReadBackExactly) {
                 EXPECT_EQ(Slot(var, 0), ("m" + std::to_string(i % 100) + "      ").substr(0, 8));
         }
     }
+}
+
+TEST_P(Reader, SetsLoseMembersTheFileDoesNotHave) {
+    SysFileBuilder b(GetParam());
+    b.Numeric("A");
+    b.Numeric("B");
+    b.MultipleResponseSets({SysFileBuilder::CategorySetLine("$ab", "Set", {"a", "GONE", "B"}),
+                            SysFileBuilder::CategorySetLine("$none", "X", {"GONE"})});
+    b.VariableSets({SysFileBuilder::VariableSetLine("Group", {"A", "B"})});
+    auto source = OpenFixture(b.WriteTemp());
+
+    const QORA_VariableSetList mr = LoadVariableSets(*source, QORA_SetFamily::kMultipleResponse);
+    ASSERT_EQ(mr.size(), 1u);
+    EXPECT_EQ(mr[0].GetName(), "$ab");
+    EXPECT_EQ(mr[0].GetLabel(), "Set");
+    EXPECT_EQ(mr[0].GetVariables(), (std::vector<std::string>{"a", "B"}));
+    const QORA_VariableSetList groups = LoadVariableSets(*source, QORA_SetFamily::kVariableSets);
+    ASSERT_EQ(groups.size(), 1u);
+    EXPECT_EQ(groups[0].GetVariables(), (std::vector<std::string>{"A", "B"}));
 }
