@@ -1,5 +1,8 @@
 #include "fileentry.h"
 
+#include <algorithm>
+#include <new>
+
 #include "qoraio32.h"
 
 FileEntry::FileEntry(std::unique_ptr<QORA_DataSource> dataSource, OpenMode mode)
@@ -21,5 +24,23 @@ int FileEntry::Check(Access access) const {
             if (!fCommitted) return QORA_STATUS_DICT_NOT_COMMITTED;
             break;
     }
+    return QORA_STATUS_OK;
+}
+
+void FileEntry::BuildValueSlots() {
+    const QORA_DataSource& source = *fpDataSource;
+    fValueSlots.clear();
+    fValueSlots.reserve(size_t(source.ColumnCount()));
+    for (int i = 0; i < source.ColumnCount(); ++i)
+        fValueSlots.push_back({source.ValueOffset(i), source.GetVariable(i).GetType()});
+}
+
+int FileEntry::OpenCaseReader() {
+    const size_t units = size_t(std::max(fpDataSource->ValueCount(), 1));
+    fpCaseBuffer.reset(new (std::nothrow) double[units]());
+    if (!fpCaseBuffer) return QORA_STATUS_NO_MEMORY;
+    fpCaseReader.reset(fpDataSource->NewIterator(fpCaseBuffer.get()));
+    if (!fpCaseReader) return QORA_STATUS_NO_MEMORY;
+    fCaseState = CaseNone;
     return QORA_STATUS_OK;
 }

@@ -7,6 +7,7 @@
 #include <string>
 #include <vector>
 
+#include "case.h"
 #include "datasrc.h"
 
 class SystemFileDataSource;
@@ -38,15 +39,19 @@ struct FileEntry {
     // the build of both tables comes with the dictionary reader.
     int BuildNameIndex();  // 0, or QORA_STATUS_BAD_FILE on a duplicate key
     void BuildValueSlots();
+    // Allocates the case buffer and makes the case reader over it: 0, or
+    // QORA_STATUS_NO_MEMORY when either cannot be had.
+    int OpenCaseReader();
 
     // Members are destroyed in the reverse of this order, which is the order
     // in which an entry is torn down: the extension readers first, the data
-    // source and the multiple response set collector last. The collector,
-    // the case reader and the 41 extension reader slots with their element
-    // counts join with the classes they hold.
+    // source and the multiple response set collector last. The collector
+    // and the 41 extension reader slots with their element counts join with
+    // the classes they hold.
     std::unique_ptr<QORA_DataSource> fpDataSource;
     std::unique_ptr<double[]> fpBlankCase;  // write and append modes only
     std::unique_ptr<double[]> fpCaseBuffer;
+    std::unique_ptr<QORA_InputCaseIterator> fpCaseReader;  // reading only; fills the case buffer
     std::vector<ValueSlot> fValueSlots;
     NameIndex fNameIndex;
 

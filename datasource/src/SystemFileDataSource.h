@@ -102,6 +102,7 @@ class SystemFileDataSource::Iterator : public QORA_InputCaseIterator {
     uint32_t ReadRaw(unsigned char* destination);
     uint32_t ReadAhead(unsigned char* destination);
     void Reposition();
+    int64_t FileEnd();
     void NoteEnd();
 
     SystemFileDataSource& fSource;
@@ -121,6 +122,7 @@ class SystemFileDataSource::Iterator : public QORA_InputCaseIterator {
     uint32_t fAheadSize = 0;
     uint32_t fAheadBegin = 0;
     uint32_t fAheadEnd = 0;
+    int64_t fFileEnd = 0;  // the size of the file when last looked at
 };
 
 // Opens a system file for reading. The name is in the interface encoding;

@@ -78,10 +78,18 @@ void SystemFileDataSource::Iterator::Reposition() {
     if (fpCompressed) {
         fpCompressed->SetRequestedCase(fRequested);
     } else {
-        fStream.Seek(fSource.fDataStart + fRequested * fCaseBytes, 0);
+        int64_t at = fSource.fDataStart + fRequested * fCaseBytes;
+        // Nothing lies beyond the end, and the system may refuse to go there.
+        if (at > fFileEnd) at = std::min(at, fFileEnd = FileEnd());
+        fStream.Seek(at, 0);
         fAheadBegin = fAheadEnd = 0;
     }
     fFileCase = fRequested;
+}
+
+int64_t SystemFileDataSource::Iterator::FileEnd() {
+    fStream.Seek(0, 2);
+    return fStream.Tell();
 }
 
 uint32_t SystemFileDataSource::Iterator::ReadAhead(unsigned char* destination) {
@@ -121,8 +129,8 @@ void SystemFileDataSource::Iterator::NoteEnd() {
     if (fpCompressed) {
         cases = fpCompressed->CurrentCase();
     } else {
-        fStream.Seek(0, 2);
-        const int64_t dataBytes = fStream.Tell() - fSource.fDataStart;
+        fFileEnd = FileEnd();
+        const int64_t dataBytes = fFileEnd - fSource.fDataStart;
         cases = dataBytes > 0 && fCaseBytes > 0 ? dataBytes / fCaseBytes : 0;
         cases = std::min(cases, fFileCase);
         fFileCase = -1;  // the stream was moved
@@ -134,7 +142,13 @@ void SystemFileDataSource::Iterator::NoteEnd() {
 bool SystemFileDataSource::Iterator::ReadCase() {
     if (fRequested != fFileCase) Reposition();
     unsigned char* const target = static_cast<unsigned char*>(Case().Buffer());
-    const uint32_t got = ReadRaw(fpRaw ? fpRaw.get() : target);
+    uint32_t got;
+    try {
+        got = ReadRaw(fpRaw ? fpRaw.get() : target);
+    } catch (...) {
+        fFileCase = -1;  // the next read starts that case again
+        throw;
+    }
     if (got == 0) {
         NoteEnd();
         return false;
