@@ -364,7 +364,7 @@ void RepairNames(QORA_DataSource& source) {
 SystemFileDataSource::SystemFileDataSource() = default;
 
 SystemFileDataSource::SystemFileDataSource(const char* fileName) {
-    if (!fStream.Open(fileName, "rb")) RaiseError(kErrCannotOpen, std::string(fileName));
+    if (!fStream.Open(fileName, "rb")) RaiseError(kErrCannotOpen, fileName);
     try {
         Read();
     } catch (const SystemFileException& e) {

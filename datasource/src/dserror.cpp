@@ -9,21 +9,21 @@ SystemFileException::SystemFileException(long number, std::string condition, con
     fWhat = "Datasource error # " + std::to_string(number) + " involving " + fCondition;
 }
 
-void RaiseError(long number, const char*) {
+void RaiseError(long number) {
     throw ErrorText("Datasource error # " + std::to_string(number));
 }
 
-void RaiseError(long number, const std::string& what, const char*) {
+void RaiseError(long number, const std::string& what) {
     throw ErrorText("Datasource error # " + std::to_string(number) + " involving " + what);
 }
 
-void RaiseError(long number, const std::string& what, const std::string& what2, const char*) {
+void RaiseError(long number, const std::string& what, const std::string& what2) {
     throw ErrorText("Datasource error # " + std::to_string(number) + " involving " + what +
                     " and " + what2);
 }
 
-void RaiseErrnoError(long number, const std::string& what, const char* catalogue) {
-    RaiseError(number, what, std::strerror(errno), catalogue);
+void RaiseErrnoError(long number, const std::string& what) {
+    RaiseError(number, what, std::strerror(errno));
 }
 
 void RaiseAssertion(const char* condition, const char* file, int line) {

@@ -54,16 +54,12 @@ enum : long {
     kWarnCodePageShown = 1721,
 };
 
-// The raising functions: they never return. The catalogue name is kept for
-// the message lookup a localised build does; it never enters the text.
-[[noreturn]] void RaiseError(long number, const char* catalogue = "datasrc.err");
-[[noreturn]] void RaiseError(long number, const std::string& what,
-                             const char* catalogue = "datasrc.err");
-[[noreturn]] void RaiseError(long number, const std::string& what, const std::string& what2,
-                             const char* catalogue = "datasrc.err");
+// The raising functions: they never return.
+[[noreturn]] void RaiseError(long number);
+[[noreturn]] void RaiseError(long number, const std::string& what);
+[[noreturn]] void RaiseError(long number, const std::string& what, const std::string& what2);
 // The same, with the text of the current errno as the last string.
-[[noreturn]] void RaiseErrnoError(long number, const std::string& what,
-                                  const char* catalogue = "datasrc.err");
+[[noreturn]] void RaiseErrnoError(long number, const std::string& what);
 [[noreturn]] void RaiseAssertion(const char* condition, const char* file, int line);
 
 // A precondition of the model: a violation is a programming error, reported
