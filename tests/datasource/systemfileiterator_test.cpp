@@ -358,3 +358,12 @@ TEST_P(CompressedBlocksTest, RawCellsFollowTheFileOrderAndStringsNever) {
     EXPECT_EQ(Text(*it, 1, 8), "        ");
     EXPECT_FALSE(it->ReadCase());
 }
+
+TEST_P(SystemFileIteratorTest, TheLastCaseCanBeReadAgainAfterTheEnd) {
+    Open(3);
+    for (int i = 0; i < 3; ++i) ExpectCase(i);
+    EXPECT_FALSE(it->ReadCase());
+    ASSERT_TRUE(it->SeekCase(2));
+    ExpectCase(2);
+    EXPECT_FALSE(it->ReadCase());
+}
