@@ -9,7 +9,7 @@
 
 namespace {
 
-enum : uint32_t { kUnit = 8, kReadAhead = 128 * 1024 };
+enum : uint32_t { kUnit = 8, kReadAhead = 256 * 1024 };
 
 [[noreturn]] void CaseCutShort(int line) {
     throw SystemFileException(kErrTooShort, "readLen== 0 || readLen == caseLen", __FILE__, line);
