@@ -1,12 +1,23 @@
 #include "fileentry.h"
 
-#include <algorithm>
-#include <new>
+#include <cstring>
 
+#include "SystemFileDataSource.h"
+#include "case.h"
 #include "qoraio32.h"
+#include "variable.h"
 
 FileEntry::FileEntry(std::unique_ptr<QORA_DataSource> dataSource, OpenMode mode)
-    : fpDataSource(std::move(dataSource)), fMode(mode), fCommitted(mode != WriteMode) {}
+    : fpDataSource(std::move(dataSource)),
+      fMode(mode),
+      fCommitted(mode != WriteMode),
+      fpSystemFile(dynamic_cast<SystemFileDataSource*>(fpDataSource.get())) {
+    if (fCommitted && fpDataSource) BuildValueSlots();
+}
+
+// The writer's finishing operation, for write and append entries with a
+// system file view, joins here with the writer.
+FileEntry::~FileEntry() = default;
 
 int FileEntry::Check(Access access) const {
     switch (access) {
@@ -27,20 +38,38 @@ int FileEntry::Check(Access access) const {
     return QORA_STATUS_OK;
 }
 
-void FileEntry::BuildValueSlots() {
-    const QORA_DataSource& source = *fpDataSource;
-    fValueSlots.clear();
-    fValueSlots.reserve(size_t(source.ColumnCount()));
-    for (int i = 0; i < source.ColumnCount(); ++i)
-        fValueSlots.push_back({source.ValueOffset(i), source.GetVariable(i).GetType()});
+SystemFileDataSource* FileEntry::SystemFileOrParent() const {
+    if (fpSystemFile || !fpDataSource) return fpSystemFile;
+    return dynamic_cast<SystemFileDataSource*>(fpDataSource->GetParent());
 }
 
-int FileEntry::OpenCaseReader() {
-    const size_t units = size_t(std::max(fpDataSource->ValueCount(), 1));
-    fpCaseBuffer.reset(new (std::nothrow) double[units]());
-    if (!fpCaseBuffer) return QORA_STATUS_NO_MEMORY;
-    fpCaseReader.reset(fpDataSource->NewIterator(fpCaseBuffer.get()));
-    if (!fpCaseReader) return QORA_STATUS_NO_MEMORY;
-    fCaseState = CaseNone;
+int FileEntry::BuildNameIndex() {
+    fNameIndex.clear();
+    for (int i = 0; i < fpDataSource->ColumnCount(); ++i) {
+        if (!fNameIndex.emplace(fpDataSource->GetVariable(i).GetKey(), i).second)
+            return QORA_STATUS_BAD_FILE;
+    }
     return QORA_STATUS_OK;
+}
+
+void FileEntry::AddToNameIndex(int index) {
+    fNameIndex[fpDataSource->GetVariable(index).GetKey()] = index;
+}
+
+int FileEntry::FindVariable(const char* name) const {
+    if (name == nullptr) return -1;
+    while (*name == ' ') ++name;
+    // The same key a variable makes of its own name, so both sides agree.
+    const auto found = fNameIndex.find(MakeLookupKey(name, std::strlen(name)));
+    if (found == fNameIndex.end() || !fpDataSource->IsValidIndex(found->second)) return -1;
+    return found->second;
+}
+
+void FileEntry::BuildValueSlots() {
+    const QORA_DataSource& source = *fpDataSource;
+    std::vector<ValueSlot> slots;
+    slots.reserve(static_cast<size_t>(source.ColumnCount()));
+    for (int i = 0; i < source.ColumnCount(); ++i)
+        slots.push_back({source.ValueOffset(i), source.GetVariable(i).GetType()});
+    fValueSlots = std::move(slots);
 }

@@ -7,9 +7,9 @@
 #include <string>
 #include <vector>
 
-#include "case.h"
 #include "datasrc.h"
 
+class QORA_InputCaseIterator;
 class SystemFileDataSource;
 
 enum OpenMode : int32_t { ReadMode = 1, WriteMode = 2, AppendMode = 3 };
@@ -30,18 +30,24 @@ using NameIndex = std::map<std::string, int32_t>;
 
 struct FileEntry {
     FileEntry(std::unique_ptr<QORA_DataSource> dataSource, OpenMode mode);
+    ~FileEntry();
 
     // 0 when the entry meets the requirement, else the status code.
     int Check(Access access) const;
     bool HasSystemFile() const { return fpSystemFile != nullptr; }
+    // The entry's own system file view or, failing that, the data source's
+    // parent when that is a system file (a transcoding source sits on one).
+    SystemFileDataSource* SystemFileOrParent() const;
 
-    // Filled from the dictionary model once the file is open or committed:
-    // the build of both tables comes with the dictionary reader.
-    int BuildNameIndex();  // 0, or QORA_STATUS_BAD_FILE on a duplicate key
+    // From each variable's key, in dictionary order: 0, or
+    // QORA_STATUS_BAD_FILE when two variables share a key.
+    int BuildNameIndex();
+    // Indexes a variable appended after the build.
+    void AddToNameIndex(int index);
+    // The dictionary index of a name given by a caller (case and surrounding
+    // blanks ignored), or -1; a null name is never found.
+    int FindVariable(const char* name) const;
     void BuildValueSlots();
-    // Allocates the case buffer and makes the case reader over it: 0, or
-    // QORA_STATUS_NO_MEMORY when either cannot be had.
-    int OpenCaseReader();
 
     // Members are destroyed in the reverse of this order, which is the order
     // in which an entry is torn down: the extension readers first, the data
@@ -51,7 +57,7 @@ struct FileEntry {
     std::unique_ptr<QORA_DataSource> fpDataSource;
     std::unique_ptr<double[]> fpBlankCase;  // write and append modes only
     std::unique_ptr<double[]> fpCaseBuffer;
-    std::unique_ptr<QORA_InputCaseIterator> fpCaseReader;  // reading only; fills the case buffer
+    std::unique_ptr<QORA_InputCaseIterator> fpCaseReader;  // over the case buffer
     std::vector<ValueSlot> fValueSlots;
     NameIndex fNameIndex;
 

@@ -3,6 +3,10 @@
 // becomes the catch-all status of the call's family, whatever it carried.
 #pragma once
 
+#include <cstdlib>
+#include <cstring>
+#include <string>
+
 #include "handletable.h"
 #include "qoraio32.h"
 
@@ -34,4 +38,36 @@ int EntryCall(int handle, Access access, CatchAll catchAll, Body&& body) noexcep
         const int status = TheHandleTable().Lookup(handle, access, &entry);
         return status == QORA_STATUS_OK ? body(*entry) : status;
     });
+}
+
+// EntryCall for a call that names a variable: runs body(FileEntry&,
+// QORA_Variable&) when the name is in the entry's name index, else returns
+// QORA_STATUS_VAR_NOT_FOUND. The catch-all is that of most calls.
+template <typename Body>
+int VariableCall(int handle, const char* name, Access access, Body&& body) noexcept {
+    return EntryCall(handle, access, kCatchHandle, [&](FileEntry& entry) -> int {
+        const int index = entry.FindVariable(name);
+        if (index < 0) return QORA_STATUS_VAR_NOT_FOUND;
+        return body(entry, entry.fpDataSource->GetVariable(index));
+    });
+}
+
+// Memory handed to a caller comes from std::malloc and goes back through the
+// matching free call. A zero-terminated copy of the bytes, or null when
+// memory runs out.
+inline char* CopyForCaller(const std::string& bytes) {
+    char* copy = static_cast<char*>(std::malloc(bytes.size() + 1));
+    if (copy != nullptr) {
+        std::memcpy(copy, bytes.data(), bytes.size());
+        copy[bytes.size()] = '\0';
+    }
+    return copy;
+}
+
+// Frees count strings (null ones skipped), then the array; a null array
+// frees nothing.
+inline void FreeCallerStrings(char** strings, int count) {
+    if (strings == nullptr) return;
+    for (int i = 0; i < count; ++i) std::free(strings[i]);
+    std::free(strings);
 }

@@ -1,0 +1,257 @@
+// Value label calls through the public header: setters on a write handle,
+// getters and the handed-out arrays on write handles and read files.
+#include <gtest/gtest.h>
+
+#include <cstring>
+#include <string>
+
+#include "api_handles.h"
+#include "qoraio32.h"
+#include "sysfile_builder.h"
+
+namespace {
+
+using fixture::Endian;
+using fixture::OpenHandle;
+using fixture::SysFileBuilder;
+
+class ValueLabels : public ::testing::Test {
+  protected:
+    void SetUp() override {
+        fixture::OpenForWrite(fDir.Path() + "/out.qsf", fHandle);
+        ASSERT_EQ(qoraSetVarName(h(), "n1", 0), QORA_STATUS_OK);
+        ASSERT_EQ(qoraSetVarName(h(), "n2", 0), QORA_STATUS_OK);
+        ASSERT_EQ(qoraSetVarName(h(), "s8", 8), QORA_STATUS_OK);
+        ASSERT_EQ(qoraSetVarName(h(), "t8", 8), QORA_STATUS_OK);
+        ASSERT_EQ(qoraSetVarName(h(), "s10", 10), QORA_STATUS_OK);
+    }
+    int h() const { return fHandle.get(); }
+    std::string NLabel(const char* var, double value, int* status = nullptr) {
+        char label[61] = "junk";
+        const int result = qoraGetVarNValueLabel(h(), var, value, label);
+        if (status) *status = result;
+        return label;
+    }
+    std::string CLabel(const char* var, const char* value, int* status = nullptr) {
+        char label[61] = "junk";
+        const int result = qoraGetVarCValueLabel(h(), var, value, label);
+        if (status) *status = result;
+        return label;
+    }
+
+    fixture::TempDir fDir;
+    OpenHandle fHandle;
+};
+
+TEST_F(ValueLabels, SingleLabelsMergeAndLookupsTellNoLabelsFromNoLabel) {
+    int status = 0;
+    EXPECT_EQ(NLabel("n1", 1.0, &status), "");
+    EXPECT_EQ(status, QORA_WARN_NO_LABELS);
+    ASSERT_EQ(qoraSetVarNValueLabel(h(), "n1", 1.0, "male"), QORA_STATUS_OK);
+    ASSERT_EQ(qoraSetVarNValueLabel(h(), "N1", 2.0, "female"), QORA_STATUS_OK);
+    ASSERT_EQ(qoraSetVarNValueLabel(h(), "n1", 1.0, "man"), QORA_STATUS_OK);
+    EXPECT_EQ(NLabel("n1", 1.0), "man");
+    EXPECT_EQ(NLabel("n1", 2.0), "female");
+    EXPECT_EQ(NLabel("n1", 3.0, &status), "");
+    EXPECT_EQ(status, QORA_WARN_NO_LABEL);
+    EXPECT_EQ(NLabel("n2", 1.0, &status), "");
+    EXPECT_EQ(status, QORA_WARN_NO_LABELS);
+    ASSERT_EQ(qoraSetVarNValueLabel(h(), "n1", 4.0, nullptr), QORA_STATUS_OK);
+    EXPECT_EQ(NLabel("n1", 4.0, &status), "");
+    EXPECT_EQ(status, QORA_STATUS_OK);
+}
+
+TEST_F(ValueLabels, KindAndNameChecks) {
+    EXPECT_EQ(qoraSetVarNValueLabel(h(), "s8", 1.0, "x"), QORA_STATUS_NUMERIC_REQUIRED);
+    EXPECT_EQ(qoraSetVarCValueLabel(h(), "n1", "a", "x"), QORA_STATUS_STRING_REQUIRED);
+    EXPECT_EQ(qoraSetVarNValueLabel(h(), "zz", 1.0, "x"), QORA_STATUS_VAR_NOT_FOUND);
+    EXPECT_EQ(qoraSetVarCValueLabel(h(), nullptr, "a", "x"), QORA_STATUS_VAR_NOT_FOUND);
+    int status = 0;
+    EXPECT_EQ(NLabel("s8", 1.0, &status), "");
+    EXPECT_EQ(status, QORA_STATUS_NUMERIC_REQUIRED);
+    EXPECT_EQ(CLabel("n1", "a", &status), "");
+    EXPECT_EQ(status, QORA_STATUS_STRING_REQUIRED);
+    EXPECT_EQ(CLabel("zz", "a", &status), "");
+    EXPECT_EQ(status, QORA_STATUS_VAR_NOT_FOUND);
+    char label[8];
+    EXPECT_EQ(qoraGetVarNValueLabelLong(h(), "n1", 1.0, label, 0, nullptr),
+              QORA_STATUS_BAD_FILE_HANDLE);
+    EXPECT_EQ(qoraGetVarNValueLabel(h(), "n1", 1.0, nullptr), QORA_STATUS_BAD_FILE_HANDLE);
+    EXPECT_EQ(qoraGetVarNValueLabel(-1, "n1", 1.0, label), QORA_STATUS_BAD_FILE_HANDLE);
+}
+
+TEST_F(ValueLabels, LongLabelsAreStoredCutWithAWarning) {
+    EXPECT_EQ(qoraSetVarNValueLabel(h(), "n1", 1.0, std::string(130, 'x').c_str()),
+              QORA_WARN_VALUE_LABEL_TRUNCATED);
+    char label[200];
+    int length = 0;
+    ASSERT_EQ(qoraGetVarNValueLabelLong(h(), "n1", 1.0, label, sizeof label, &length),
+              QORA_STATUS_OK);
+    EXPECT_EQ(length, 120);
+    EXPECT_EQ(NLabel("n1", 1.0), std::string(60, 'x'));
+    ASSERT_EQ(qoraSetVarCValueLabel(h(), "s8", "a", std::string(100, 'y').c_str()), QORA_STATUS_OK);
+    EXPECT_EQ(CLabel("s8", "a"), std::string(60, 'y'));
+    ASSERT_EQ(qoraGetVarCValueLabelLong(h(), "s8", "a", label, 6, &length), QORA_STATUS_OK);
+    EXPECT_STREQ(label, "yyyyy");
+    EXPECT_EQ(length, 5);
+}
+
+TEST_F(ValueLabels, Utf8LabelsAreCutAtWholeCharacters) {
+    fixture::Utf8Mode utf8;
+    std::string euros;
+    for (int i = 0; i < 43; ++i) euros += "\xE2\x82\xAC";
+    const std::string label = "a" + euros;  // 130 bytes
+    EXPECT_EQ(qoraSetVarNValueLabel(h(), "n1", 1.0, label.c_str()),
+              QORA_WARN_VALUE_LABEL_TRUNCATED);
+    char out[200];
+    int length = 0;
+    ASSERT_EQ(qoraGetVarNValueLabelLong(h(), "n1", 1.0, out, sizeof out, &length), QORA_STATUS_OK);
+    EXPECT_EQ(std::string(out), label.substr(0, 118));
+    EXPECT_EQ(length, 118);
+    EXPECT_EQ(NLabel("n1", 1.0), label.substr(0, 58));
+    // A 9-byte string value cut at the width of 8 keeps whole characters too.
+    ASSERT_EQ(qoraSetVarCValueLabel(h(), "s8", "abc\xE2\x82\xAC\xE2\x82\xAC", "cut"),
+              QORA_STATUS_OK);
+    EXPECT_EQ(CLabel("s8", "abc\xE2\x82\xAC"), "cut");
+}
+
+TEST_F(ValueLabels, StringValuesArePaddedAndCutAtTheWidth) {
+    ASSERT_EQ(qoraSetVarCValueLabel(h(), "s8", "abc", "three"), QORA_STATUS_OK);
+    EXPECT_EQ(CLabel("s8", "abc"), "three");
+    EXPECT_EQ(CLabel("s8", "abc   "), "three");
+    ASSERT_EQ(qoraSetVarCValueLabel(h(), "s10", "0123456789XYZW", "ten"), QORA_STATUS_OK);
+    EXPECT_EQ(CLabel("s10", "0123456789"), "ten");
+    EXPECT_EQ(CLabel("s10", "0123456789Q"), "ten");
+
+    char** values = nullptr;
+    char** labels = nullptr;
+    int count = 0;
+    ASSERT_EQ(qoraGetVarCValueLabels(h(), "s8", &values, &labels, &count), QORA_STATUS_OK);
+    ASSERT_EQ(count, 1);
+    EXPECT_STREQ(values[0], "abc     ");
+    EXPECT_STREQ(labels[0], "three");
+    EXPECT_EQ(qoraFreeVarCValueLabels(values, labels, count), QORA_STATUS_OK);
+    ASSERT_EQ(qoraGetVarCValueLabels(h(), "s10", &values, &labels, &count), QORA_STATUS_OK);
+    ASSERT_EQ(count, 1);
+    EXPECT_STREQ(values[0], "0123456789      ");  // two value units
+    EXPECT_EQ(qoraFreeVarCValueLabels(values, labels, count), QORA_STATUS_OK);
+}
+
+TEST_F(ValueLabels, SetFormsReplaceEveryNamedVariablesLabels) {
+    ASSERT_EQ(qoraSetVarNValueLabel(h(), "n1", 9.0, "old"), QORA_STATUS_OK);
+    const char* vars[] = {"n1", "N2"};
+    const double values[] = {1.0, 2.0};
+    const char* labels[] = {"one", "two"};
+    ASSERT_EQ(qoraSetVarNValueLabels(h(), vars, 2, values, labels, 2), QORA_STATUS_OK);
+    int status = 0;
+    EXPECT_EQ(NLabel("n1", 9.0, &status), "");
+    EXPECT_EQ(status, QORA_WARN_NO_LABEL);
+    EXPECT_EQ(NLabel("n2", 2.0), "two");
+    ASSERT_EQ(qoraSetVarNValueLabel(h(), "n1", 3.0, "three"), QORA_STATUS_OK);
+    EXPECT_EQ(NLabel("n1", 3.0), "three");
+    EXPECT_EQ(NLabel("n2", 3.0, &status), "");
+    EXPECT_EQ(status, QORA_WARN_NO_LABEL);
+
+    double* outValues = nullptr;
+    char** outLabels = nullptr;
+    int count = 0;
+    ASSERT_EQ(qoraGetVarNValueLabels(h(), "n1", &outValues, &outLabels, &count), QORA_STATUS_OK);
+    ASSERT_EQ(count, 3);
+    EXPECT_EQ(outValues[0] * 100 + outValues[1] * 10 + outValues[2], 123.0);
+    EXPECT_STREQ(outLabels[2], "three");
+    EXPECT_EQ(qoraFreeVarNValueLabels(outValues, outLabels, count), QORA_STATUS_OK);
+
+    // The first failing variable stops the call before anything changes.
+    const char* bad[] = {"n1", "s8"};
+    EXPECT_EQ(qoraSetVarNValueLabels(h(), bad, 2, values, labels, 2), QORA_STATUS_NUMERIC_REQUIRED);
+    const char* absent[] = {"n1", "zz"};
+    EXPECT_EQ(qoraSetVarNValueLabels(h(), absent, 2, values, labels, 2), QORA_STATUS_VAR_NOT_FOUND);
+    EXPECT_EQ(NLabel("n1", 3.0), "three");
+    const std::string longLabel(121, 'z');
+    const char* cut[] = {"one", longLabel.c_str()};
+    EXPECT_EQ(qoraSetVarNValueLabels(h(), vars, 2, values, cut, 2),
+              QORA_WARN_VALUE_LABEL_TRUNCATED);
+    EXPECT_EQ(qoraSetVarNValueLabels(h(), vars, 2, nullptr, labels, 2),
+              QORA_STATUS_BAD_FILE_HANDLE);
+    EXPECT_EQ(qoraSetVarNValueLabels(h(), nullptr, 2, values, labels, 2),
+              QORA_STATUS_BAD_FILE_HANDLE);
+}
+
+TEST_F(ValueLabels, StringSetFormsNeedOneWidth) {
+    const char* values[] = {"a", "b"};
+    const char* labels[] = {"A", "B"};
+    const char* mixed[] = {"s8", "s10"};
+    ASSERT_EQ(qoraSetVarCValueLabel(h(), "s10", "q", "Q"), QORA_STATUS_OK);
+    EXPECT_EQ(qoraSetVarCValueLabels(h(), mixed, 2, values, labels, 2), QORA_STATUS_WIDTH_MISMATCH);
+    int status = 0;
+    EXPECT_EQ(CLabel("s8", "a", &status), "");
+    EXPECT_EQ(status, QORA_WARN_NO_LABELS);
+    EXPECT_EQ(CLabel("s10", "q"), "Q");
+    const char* numeric[] = {"s8", "n1"};
+    EXPECT_EQ(qoraSetVarCValueLabels(h(), numeric, 2, values, labels, 2),
+              QORA_STATUS_STRING_REQUIRED);
+    const char* same[] = {"s8", "t8"};
+    ASSERT_EQ(qoraSetVarCValueLabels(h(), same, 2, values, labels, 2), QORA_STATUS_OK);
+    EXPECT_EQ(CLabel("t8", "b"), "B");
+    EXPECT_EQ(CLabel("s8", "a"), "A");
+}
+
+TEST_F(ValueLabels, ArrayCallsClearTheirOutputsOnFailure) {
+    double* values = reinterpret_cast<double*>(this);
+    char** labels = reinterpret_cast<char**>(this);
+    int count = 7;
+    EXPECT_EQ(qoraGetVarNValueLabels(h(), "n1", &values, &labels, &count), QORA_WARN_NO_LABELS);
+    EXPECT_EQ(values, nullptr);
+    EXPECT_EQ(labels, nullptr);
+    EXPECT_EQ(count, 0);
+    char** strings = labels;
+    EXPECT_EQ(qoraGetVarCValueLabels(h(), "n1", &strings, &labels, &count),
+              QORA_STATUS_STRING_REQUIRED);
+    EXPECT_EQ(qoraGetVarNValueLabels(h(), "n1", nullptr, &labels, &count),
+              QORA_STATUS_BAD_FILE_HANDLE);
+    EXPECT_EQ(qoraFreeVarNValueLabels(nullptr, nullptr, 5), QORA_STATUS_OK);
+    EXPECT_EQ(qoraFreeVarCValueLabels(nullptr, nullptr, 5), QORA_STATUS_OK);
+}
+
+class ValueLabelsFromFile : public ::testing::TestWithParam<Endian> {};
+
+TEST_P(ValueLabelsFromFile, ReadBackInKeyOrder) {
+    SysFileBuilder b(GetParam());
+    b.Numeric("SEX");
+    b.Numeric("OTHER");
+    b.String("CODE", 6);
+    b.ValueLabels({{2.0, "female"}, {1.0, "male"}}, {b.Slot("SEX"), b.Slot("OTHER")});
+    b.ValueLabels({{"AB", "alpha"}, {"ZZZZZZ", "zed"}}, {b.Slot("CODE")});
+    OpenHandle h;
+    fixture::OpenForRead(b.WriteTemp(), h);
+    char label[61];
+    ASSERT_EQ(qoraGetVarNValueLabel(h.get(), "sex", 2.0, label), QORA_STATUS_OK);
+    EXPECT_STREQ(label, "female");
+    ASSERT_EQ(qoraGetVarNValueLabel(h.get(), "other", 1.0, label), QORA_STATUS_OK);
+    EXPECT_STREQ(label, "male");
+    ASSERT_EQ(qoraGetVarCValueLabel(h.get(), "code", "AB", label), QORA_STATUS_OK);
+    EXPECT_STREQ(label, "alpha");
+    EXPECT_EQ(qoraSetVarNValueLabel(h.get(), "sex", 3.0, "x"), QORA_STATUS_OPENED_FOR_READING);
+
+    double* values = nullptr;
+    char** labels = nullptr;
+    int count = 0;
+    ASSERT_EQ(qoraGetVarNValueLabels(h.get(), "SEX", &values, &labels, &count), QORA_STATUS_OK);
+    ASSERT_EQ(count, 2);
+    EXPECT_EQ(values[0], 1.0);
+    EXPECT_STREQ(labels[0], "male");
+    EXPECT_EQ(values[1], 2.0);
+    EXPECT_EQ(qoraFreeVarNValueLabels(values, labels, count), QORA_STATUS_OK);
+    char** strings = nullptr;
+    ASSERT_EQ(qoraGetVarCValueLabels(h.get(), "CODE", &strings, &labels, &count), QORA_STATUS_OK);
+    ASSERT_EQ(count, 2);
+    EXPECT_STREQ(strings[0], "AB      ");
+    EXPECT_STREQ(strings[1], "ZZZZZZ  ");
+    EXPECT_STREQ(labels[1], "zed");
+    EXPECT_EQ(qoraFreeVarCValueLabels(strings, labels, count), QORA_STATUS_OK);
+}
+
+INSTANTIATE_TEST_SUITE_P(Orders, ValueLabelsFromFile,
+                         ::testing::Values(Endian::Native, Endian::Swapped), fixture::EndianName);
+
+}  // namespace
