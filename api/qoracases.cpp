@@ -2,6 +2,7 @@
 // of the current case, and the special values of the numeric model.
 #include <cstring>
 
+#include "case.h"
 #include "qoracall.h"
 #include "specialvalues.h"
 
