@@ -43,6 +43,7 @@ class SystemFileIteratorTest : public ::testing::TestWithParam<DataForm> {
     void Open(int cases, std::optional<int32_t> headerCount = std::nullopt) {
         StandardCases(b, cases);
         if (headerCount) b.header().caseCount = *headerCount;
+        it.reset();  // an iterator goes before its source
         source = OpenFixture(b.WriteTemp());
         it.reset(source->NewIterator(nullptr));
     }
@@ -263,6 +264,7 @@ class CompressedBlocksTest : public ByteOrders {
         b.header().caseCount = -1;
     }
     void Open() {
+        it.reset();  // an iterator goes before its source
         source = OpenFixture(b.WriteTemp());
         it.reset(source->NewIterator(nullptr));
     }
