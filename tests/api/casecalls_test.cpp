@@ -149,9 +149,13 @@ TEST_P(CaseCallsTest, SeeksOutsideTheFileAreRefusedOrFindTheEnd) {
     EXPECT_EQ(qoraSeekNextCase(handle, -1), QORA_STATUS_READ_FAILED);
     double x;
     EXPECT_EQ(qoraGetValueNumeric(handle, 1.0, &x), QORA_STATUS_NO_CURRENT_CASE);
+    int count = 0;
+    EXPECT_EQ(qoraGetNumberofCases(handle, &count), QORA_STATUS_OK);
+    EXPECT_EQ(count, -1);
     EXPECT_EQ(qoraSeekNextCase(handle, 2147483647), QORA_STATUS_OK);
     EXPECT_EQ(qoraReadCaseRecord(handle), QORA_WARN_END_OF_FILE);
-    EXPECT_EQ(Entry(handle).fpDataSource->CaseCount(), 4);
+    EXPECT_EQ(qoraGetNumberofCases(handle, &count), QORA_STATUS_OK);
+    EXPECT_EQ(count, 4);
     EXPECT_EQ(qoraSeekNextCase(handle, 1), QORA_STATUS_OK);
     ASSERT_EQ(qoraReadCaseRecord(handle), QORA_STATUS_OK);
     ExpectValues(1);
@@ -159,6 +163,26 @@ TEST_P(CaseCallsTest, SeeksOutsideTheFileAreRefusedOrFindTheEnd) {
 
 // A case cut short is an error each time it is asked for, and leaves no
 // half-read values behind.
+// A count that lies either way is the true one once the end was met.
+TEST_P(CaseCallsTest, TheCountOfTheHeaderGivesWayToTheCasesRead) {
+    for (int32_t claimed : {9, 2}) {
+        SCOPED_TRACE(claimed);
+        if (handle >= 0) qoraCloseRead(handle);
+        b = SysFileBuilder(std::get<0>(GetParam()));
+        b.Compressed(std::get<1>(GetParam()));
+        b.header().caseCount = claimed;
+        Open(4);
+        int count = 0, size = 0;
+        EXPECT_EQ(qoraGetCaseSize(handle, &size), QORA_STATUS_OK);
+        EXPECT_EQ(size, 32);
+        double record[4];
+        for (int i = 0; i < 4; ++i) ASSERT_EQ(qoraWholeCaseIn(handle, record), QORA_STATUS_OK);
+        EXPECT_EQ(qoraWholeCaseIn(handle, record), QORA_WARN_END_OF_FILE);
+        EXPECT_EQ(qoraGetNumberofCases(handle, &count), QORA_STATUS_OK);
+        EXPECT_EQ(count, 4);
+    }
+}
+
 TEST_P(CaseCallsTest, DataEndingInsideACaseFailsTheRead) {
     StandardCases(b, 3);
     const Bytes bytes = b.Build();
