@@ -99,7 +99,13 @@ uint32_t SystemFileDataSource::Iterator::ReadAhead(unsigned char* destination) {
         fAheadEnd -= fAheadBegin;
         fAheadBegin = 0;
         while (fAheadEnd < fCaseBytes) {
-            const uint32_t got = fStream.Read(ahead + fAheadEnd, fAheadSize - fAheadEnd);
+            // Ending on a block boundary lets the stream read it all in one call.
+            uint32_t want = fAheadSize - fAheadEnd;
+            const int64_t aligned =
+                (fStream.Tell() + want) & ~int64_t{QORA_FileStream::kBlockAlign - 1};
+            if (aligned - fStream.Tell() >= int64_t{fCaseBytes - fAheadEnd})
+                want = uint32_t(aligned - fStream.Tell());
+            const uint32_t got = fStream.Read(ahead + fAheadEnd, want);
             if (got == 0) break;
             fAheadEnd += got;
         }
