@@ -369,3 +369,21 @@ TEST_P(SystemFileIteratorTest, TheLastCaseCanBeReadAgainAfterTheEnd) {
     ExpectCase(2);
     EXPECT_FALSE(it->ReadCase());
 }
+
+// 24-byte cases never line up with the read-ahead or the stream's blocks.
+TEST_P(SystemFileIteratorTest, CasesStraddlingTheReadAheadArriveWhole) {
+    const int n = 15000;
+    b.Numeric("X");
+    b.String("S", 9);
+    for (int i = 0; i < n; ++i) b.Case({i * 0.5, std::to_string(i)});
+    source = OpenFixture(b.WriteTemp());
+    it.reset(source->NewIterator(nullptr));
+    for (int i = 0; i < n; ++i) {
+        ASSERT_TRUE(it->ReadCase());
+        ASSERT_EQ(Number(*it, 0), i * 0.5);
+        const std::string digits = std::to_string(i);
+        ASSERT_EQ(Text(*it, 1, 16), digits + std::string(16 - digits.size(), ' '));
+    }
+    EXPECT_FALSE(it->ReadCase());
+    EXPECT_EQ(source->CaseCount(), n);
+}
