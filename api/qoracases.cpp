@@ -24,35 +24,35 @@ const char* ValueAt(const FileEntry& entry, const ValueSlot& slot) {
     return reinterpret_cast<const char*>(entry.fpCaseBuffer.get()) + size_t(slot.offset) * 8;
 }
 
-// The case buffer is no longer a case while it is being filled, so a read
-// that fails half-way leaves no values to fetch.
-int ReadNextCase(FileEntry& entry) {
+// Reads the next case into the case buffer, or straight into a whole case
+// record. The case buffer is no longer a case while it is being filled, so
+// a read that fails half-way leaves no values to fetch.
+int ReadNextCase(FileEntry& entry, void* record) {
     if (entry.fCaseState == CaseAtEnd) return QORA_WARN_END_OF_FILE;
-    if (!entry.fpCaseReader) return QORA_STATUS_NO_MEMORY;
+    QORA_InputCaseIterator* reader = entry.fpCaseReader.get();
+    if (!reader) return QORA_STATUS_NO_MEMORY;
     entry.fCaseState = CaseNone;
-    if (!entry.fpCaseReader->ReadCase()) {
+    if (!(record ? reader->ReadCaseInto(record) : reader->ReadCase())) {
         entry.fCaseState = CaseAtEnd;
         return QORA_WARN_END_OF_FILE;
     }
-    entry.fCaseState = CaseLoaded;
+    entry.fCaseState = record ? CaseNone : CaseLoaded;
     return QORA_STATUS_OK;
 }
 
 }  // namespace
 
 int QORA_API qoraReadCaseRecord(int handle) {
-    return EntryCall(handle, AccessReadCases, kCatchCaseIn, ReadNextCase);
+    return EntryCall(handle, AccessReadCases, kCatchCaseIn,
+                     [](FileEntry& entry) { return ReadNextCase(entry, nullptr); });
 }
 
+// The case goes to the caller's record without a stop in the case buffer;
+// no value of it can be fetched afterwards either way.
 int QORA_API qoraWholeCaseIn(int handle, void* caseRecord) {
     return EntryCall(handle, AccessReadCases, kCatchCaseIn, [&](FileEntry& entry) {
         if (caseRecord == nullptr) return int(QORA_STATUS_READ_FAILED);
-        const int status = ReadNextCase(entry);
-        if (status != QORA_STATUS_OK) return status;
-        std::memcpy(caseRecord, entry.fpCaseBuffer.get(),
-                    size_t(entry.fpDataSource->ValueCount()) * 8);
-        entry.fCaseState = CaseNone;
-        return int(QORA_STATUS_OK);
+        return ReadNextCase(entry, caseRecord);
     });
 }
 

@@ -64,3 +64,16 @@ void QORA_InputCaseIterator::Link(QORA_InputCaseIterator* other) {
     fCase.SetLink(other);
     if (other != nullptr) other->ForwardSetting(fCase.GetSetting());
 }
+
+bool QORA_InputCaseIterator::ReadCaseInto(void* units) {
+    void* const own = fCase.Buffer();
+    fCase.SetBuffer(units);
+    try {
+        const bool read = ReadCase();
+        fCase.SetBuffer(own);
+        return read;
+    } catch (...) {
+        fCase.SetBuffer(own);
+        throw;
+    }
+}

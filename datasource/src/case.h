@@ -37,6 +37,10 @@ class QORA_Case {
     void Clear(int first, int last);
     void ClearAll();
 
+    // Points the case at other memory of ValueCount() units, not owned; the
+    // memory the case owns, if any, stays allocated.
+    void SetBuffer(void* buffer) { fpBuffer = buffer; }
+
     // The iterator chain: the next iterator and the setting passed down it.
     QORA_InputCaseIterator* GetLink() const { return fpLink; }
     void SetLink(QORA_InputCaseIterator* link) { fpLink = link; }
@@ -71,7 +75,12 @@ class QORA_InputCaseIterator {
     // The next case to read.
     virtual int64_t TellCase() const = 0;
     // Fills the case with the next case; false at the end of the data.
+    // Every iterator finds its case's memory through Case().Buffer() at each
+    // read, so that ReadCaseInto can lend it other memory.
     virtual bool ReadCase() = 0;
+    // Reads the next case straight into units (ValueCount() units) instead
+    // of the case's own memory, which keeps its previous contents.
+    bool ReadCaseInto(void* units);
 
     QORA_DataSource& DataSource() const { return fCase.DataSource(); }
     QORA_Case& Case() { return fCase; }

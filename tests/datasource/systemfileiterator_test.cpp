@@ -387,3 +387,16 @@ TEST_P(SystemFileIteratorTest, CasesStraddlingTheReadAheadArriveWhole) {
     EXPECT_FALSE(it->ReadCase());
     EXPECT_EQ(source->CaseCount(), n);
 }
+
+TEST_P(SystemFileIteratorTest, ReadingIntoOtherMemoryLeavesTheCaseAlone) {
+    Open(2);
+    ExpectCase(0);
+    double record[4];
+    ASSERT_TRUE(it->ReadCaseInto(record));
+    EXPECT_EQ(record[0], ExpectedX(1));
+    EXPECT_EQ(std::string(reinterpret_cast<char*>(&record[1]), 16), ExpectedS(1) + "    ");
+    EXPECT_EQ(Number(*it, 0), ExpectedX(0));
+    EXPECT_FALSE(it->ReadCaseInto(record));
+    ASSERT_TRUE(it->SeekCase(1));
+    ExpectCase(1);
+}
