@@ -19,25 +19,6 @@ FileEntry::FileEntry(std::unique_ptr<QORA_DataSource> dataSource, OpenMode mode)
 // system file view, joins here with the writer.
 FileEntry::~FileEntry() = default;
 
-int FileEntry::Check(Access access) const {
-    switch (access) {
-        case AccessAny:
-            break;
-        case AccessDefine:
-            if (fMode == ReadMode) return QORA_STATUS_OPENED_FOR_READING;
-            if (fCommitted) return QORA_STATUS_DICT_COMMITTED;
-            break;
-        case AccessReadCases:
-            if (fMode != ReadMode) return QORA_STATUS_NOT_OPENED_FOR_READING;
-            break;
-        case AccessWriteCases:
-            if (fMode == ReadMode) return QORA_STATUS_OPENED_FOR_READING;
-            if (!fCommitted) return QORA_STATUS_DICT_NOT_COMMITTED;
-            break;
-    }
-    return QORA_STATUS_OK;
-}
-
 SystemFileDataSource* FileEntry::SystemFileOrParent() const {
     if (fpSystemFile || !fpDataSource) return fpSystemFile;
     return dynamic_cast<SystemFileDataSource*>(fpDataSource->GetParent());

@@ -8,6 +8,7 @@
 #include <vector>
 
 #include "datasrc.h"
+#include "qoraio32.h"
 
 class QORA_InputCaseIterator;
 class SystemFileDataSource;
@@ -66,3 +67,23 @@ struct FileEntry {
     bool fCommitted;                               // the dictionary is final
     SystemFileDataSource* fpSystemFile = nullptr;  // the data source, when it is a system file
 };
+
+// Inline: every exported call on a file passes here.
+inline int FileEntry::Check(Access access) const {
+    switch (access) {
+        case AccessAny:
+            break;
+        case AccessDefine:
+            if (fMode == ReadMode) return QORA_STATUS_OPENED_FOR_READING;
+            if (fCommitted) return QORA_STATUS_DICT_COMMITTED;
+            break;
+        case AccessReadCases:
+            if (fMode != ReadMode) return QORA_STATUS_NOT_OPENED_FOR_READING;
+            break;
+        case AccessWriteCases:
+            if (fMode == ReadMode) return QORA_STATUS_OPENED_FOR_READING;
+            if (!fCommitted) return QORA_STATUS_DICT_NOT_COMMITTED;
+            break;
+    }
+    return QORA_STATUS_OK;
+}

@@ -2,14 +2,6 @@
 
 #include "qoraio32.h"
 
-int HandleTable::Lookup(int handle, Access access, FileEntry** entry) const {
-    *entry = nullptr;
-    if (handle < 0 || handle >= kSlots || !fSlots[handle]) return QORA_STATUS_BAD_FILE_HANDLE;
-    const int status = fSlots[handle]->Check(access);
-    if (status == QORA_STATUS_OK) *entry = fSlots[handle].get();
-    return status;
-}
-
 int HandleTable::Insert(std::unique_ptr<FileEntry> entry, int* handle) {
     for (int slot = 0; slot < kSlots; ++slot) {
         if (!fSlots[slot]) {

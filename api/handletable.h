@@ -26,3 +26,12 @@ class HandleTable {
 
 // The one table of the process, created when the library is loaded.
 HandleTable& TheHandleTable();
+
+// Inline: every exported call on a file passes here.
+inline int HandleTable::Lookup(int handle, Access access, FileEntry** entry) const {
+    *entry = nullptr;
+    if (handle < 0 || handle >= kSlots || !fSlots[handle]) return QORA_STATUS_BAD_FILE_HANDLE;
+    const int status = fSlots[handle]->Check(access);
+    if (status == QORA_STATUS_OK) *entry = fSlots[handle].get();
+    return status;
+}
