@@ -1,5 +1,5 @@
-// The access checks of a file entry, the handle table's refusals and the call
-// frame that turns every exception into the call's catch-all status.
+// The access checks of a file entry and the call frame that turns every exception into the call's
+// catch-all status.
 #include "handletable.h"
 
 #include <gtest/gtest.h>
@@ -34,17 +34,6 @@ TEST(FileEntry, AccessChecksGiveTheirStatusCodes) {
     }
 }
 
-TEST(HandleTable, RefusesHandlesOutsideTheTableAndClearsTheEntry) {
-    HandleTable table;
-    FileEntry other(nullptr, ReadMode);
-    for (int handle : {-1, 0, 99, 100, -2147483647 - 1, 2147483647}) {
-        FileEntry* entry = &other;
-        EXPECT_EQ(table.Lookup(handle, AccessAny, &entry), QORA_STATUS_BAD_FILE_HANDLE);
-        EXPECT_EQ(entry, nullptr);
-        EXPECT_EQ(table.Close(handle), QORA_STATUS_BAD_FILE_HANDLE);
-    }
-}
-
 TEST(CallFrame, MapsEveryExceptionToTheCatchAll) {
     EXPECT_EQ(GuardedCall(kCatchHandle, [] { return QORA_WARN_NO_LABEL; }), QORA_WARN_NO_LABEL);
     EXPECT_EQ(GuardedCall(kCatchCaseOut, []() -> int { throw ErrorText("x"); }), 2);
@@ -56,23 +45,6 @@ TEST(CallFrame, MapsEveryExceptionToTheCatchAll) {
     EXPECT_EQ(GuardedCall(kCatchHandle, []() -> int { throw 42; }), 5);
     EXPECT_EQ(GuardedCall(kCatchOpen, []() -> int { return QORA_ASSERT(1 < 0), 0; }), 6);
     EXPECT_EQ(GuardedCall(kCatchCaseIn, []() -> int { RaiseError(kErrTooShort, "header"); }), 3);
-}
-
-TEST(CallFrame, RunsTheBodyOnlyOnAnEntryThatPassesItsCheck) {
-    int handle = -1;
-    auto entry = std::make_unique<FileEntry>(nullptr, WriteMode);
-    ASSERT_EQ(TheHandleTable().Insert(std::move(entry), &handle), QORA_STATUS_OK);
-    int runs = 0;
-    auto body = [&](FileEntry& e) { return ++runs, e.fMode == WriteMode ? QORA_STATUS_OK : -100; };
-    EXPECT_EQ(EntryCall(handle, AccessDefine, kCatchHandle, body), QORA_STATUS_OK);
-    EXPECT_EQ(EntryCall(handle, AccessWriteCases, kCatchCaseOut, body), 31);
-    EXPECT_EQ(EntryCall(handle, AccessReadCases, kCatchCaseIn, body), 9);
-    EXPECT_EQ(EntryCall(100, AccessAny, kCatchCaseIn, body), 5);
-    EXPECT_EQ(runs, 1);
-    auto throws = [](FileEntry&) -> int { throw std::bad_alloc(); };
-    EXPECT_EQ(EntryCall(handle, AccessAny, kCatchCaseIn, throws), 3);
-    EXPECT_EQ(TheHandleTable().Close(handle), QORA_STATUS_OK);
-    EXPECT_EQ(EntryCall(handle, AccessAny, kCatchCaseIn, body), 5);
 }
 
 }  // namespace

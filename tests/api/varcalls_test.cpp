@@ -1,5 +1,5 @@
 // Variable definition calls through the public header: set on a write
-// handle and read back, and read from files made by the fixture builder.
+// handle and read back (files read back in bigdictionary_test.cpp).
 #include <gtest/gtest.h>
 
 #include <cstring>
@@ -13,9 +13,7 @@
 
 namespace {
 
-using fixture::Endian;
 using fixture::OpenHandle;
-using fixture::SysFileBuilder;
 
 // A write handle in a directory of its own, with the variables a test names.
 class WriteHandle : public ::testing::Test {
@@ -290,58 +288,5 @@ TEST(VariableGetters, ClearOutputsOnABadHandle) {
     EXPECT_EQ(v, 0.0);
     EXPECT_EQ(qoraSetVarName(-7, "a", 0), QORA_STATUS_BAD_FILE_HANDLE);
 }
-
-// Every property of the variable records, read back from a file.
-class VariablesFromFile : public ::testing::TestWithParam<Endian> {};
-
-TEST_P(VariablesFromFile, ReadEveryPropertyBack) {
-    SysFileBuilder b(GetParam());
-    b.Numeric("AGE").Label("Age in years").Missing({-1.0, 99.0});
-    b.Numeric("INCOME")
-        .MissingRange(-9.0, -1.0, 999.0)
-        .Formats(fixture::FormatWord(5, 10, 2), fixture::FormatWord(17, 12, 0));
-    b.String("CODE", 4).MissingStrings({"NA", "XX"});
-    b.String("COMMENT", 30).Label("Free text");
-    OpenHandle h;
-    fixture::OpenForRead(b.WriteTemp(), h);
-
-    char text[300];
-    int count = 0, type = 0;
-    ASSERT_EQ(qoraGetVarInfo(h.get(), 3, text, &type), QORA_STATUS_OK);
-    EXPECT_EQ(text + std::string("|") + std::to_string(type),
-              "comment|30");  // no long names record: lower case
-    ASSERT_EQ(qoraGetVarLabel(h.get(), "Age", text), QORA_STATUS_OK);
-    EXPECT_STREQ(text, "Age in years");
-    ASSERT_EQ(qoraGetVarLabel(h.get(), "comment", text), QORA_STATUS_OK);
-    EXPECT_STREQ(text, "Free text");
-    EXPECT_EQ(qoraGetVarLabel(h.get(), "income", text), QORA_WARN_NO_LABEL);
-
-    double v[3];
-    ASSERT_EQ(qoraGetVarNMissingValues(h.get(), "age", &count, &v[0], &v[1], &v[2]),
-              QORA_STATUS_OK);
-    EXPECT_EQ(count, 2);
-    EXPECT_EQ(v[0], -1.0);
-    EXPECT_EQ(v[1], 99.0);
-    ASSERT_EQ(qoraGetVarNMissingValues(h.get(), "income", &count, &v[0], &v[1], &v[2]),
-              QORA_STATUS_OK);
-    EXPECT_EQ(count, -3);
-    EXPECT_EQ(v[0], -9.0);
-    EXPECT_EQ(v[1], -1.0);
-    EXPECT_EQ(v[2], 999.0);
-    char s1[9], s2[9], s3[9];
-    ASSERT_EQ(qoraGetVarCMissingValues(h.get(), "code", &count, s1, s2, s3), QORA_STATUS_OK);
-    EXPECT_EQ(std::to_string(count) + "|" + s1 + "|" + s2, "2|NA  |XX  ");
-
-    EXPECT_EQ(Format(qoraGetVarPrintFormat, h.get(), "income"), 51002);
-    EXPECT_EQ(Format(qoraGetVarWriteFormat, h.get(), "income"), 171200);
-    EXPECT_EQ(Format(qoraGetVarPrintFormat, h.get(), "comment"), 13000);
-    int level = -1;
-    EXPECT_EQ(qoraGetVarMeasureLevel(h.get(), "age", &level), QORA_STATUS_OK);
-    EXPECT_GE(level, 0);
-    EXPECT_LE(level, 3);
-}
-
-INSTANTIATE_TEST_SUITE_P(Orders, VariablesFromFile,
-                         ::testing::Values(Endian::Native, Endian::Swapped), fixture::EndianName);
 
 }  // namespace
