@@ -15,6 +15,7 @@ TEST(Convert, CutsBlanksTerminatorsAndErrors) {
         std::string dst;  // the leading bytes of the destination
         int error;
     } rows[] = {
+        // clang-format off
         {"cp1252", true, "caf\xE9 \x80\0"s, -1, 16, 9, "caf\xC3\xA9 \xE2\x82\xAC\0"s, 0},
         // Room for 3 bytes and the terminator: the second character would be split.
         {"cp1252", true, "\xE9\xE9\xE9\0"s, -1, 4, 2, "\xC3\xA9\0x"s, 1},
@@ -35,6 +36,7 @@ TEST(Convert, CutsBlanksTerminatorsAndErrors) {
         {"cp1252", false, "a\xFF", 2, 16, 2, "a? ", 3},
         {"cp1252", false, "a\xC0\x80", 3, 16, 3, "a?? ", 3},
         {"cp1252", false, "a\xED\xA0\x80", 4, 16, 4, "a??? ", 3},
+        // clang-format on
     };
     for (size_t i = 0; i < std::size(rows); ++i) {
         const auto& r = rows[i];

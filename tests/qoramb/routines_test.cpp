@@ -14,26 +14,20 @@ TEST(Routines, CharLength) {
         size_t n;
         int expected;
     } rows[] = {
-        {kUtf8, "\xC3\xA9", 2, 2},
-        {kUtf8, "\xA9", 1, -1},
+        // clang-format off
+        {kUtf8, "\xC3\xA9", 2, 2}, {kUtf8, "\xA9", 1, -1},
         {kUtf8, "\xC3\0"s, 2, -1},  // lead byte followed by the terminator
-        {kUtf8, "\0"s, 5, 0},
-        {kUtf8, "a", 0, 0},
-        {kUtf8, "a", 1, 1},
+        {kUtf8, "\0"s, 5, 0}, {kUtf8, "a", 0, 0}, {kUtf8, "a", 1, 1},
         {kUtf8, "\xF0\x9F\x98\x80", 4, 4},
         {kUtf8, "\xC0\x80", 2, -1},      // overlong
         {kUtf8, "\xE0\x80\x80", 3, -1},  // overlong
         {kUtf8, "\xED\xA0\x80", 3, -1},  // surrogate
-        {kUtf8, "\xF4\x90\x80\x80", 4, -1},
-        {kUtf8, "\xFE", 1, -1},
-        {kUtf8, "\xFF", 1, -1},
+        {kUtf8, "\xF4\x90\x80\x80", 4, -1}, {kUtf8, "\xFE", 1, -1}, {kUtf8, "\xFF", 1, -1},
         {kUtf8, "\xE4\xB8", 2, -1},  // longer than the bytes given
         {kUtf8, "\xE4\xB8\xAD", 3, 3},
         {kCp1252, "\xE9", 1, 1},
-        {kGbk, "\xD6\xD0", 2, 2},
-        {kGbk, "a", 1, 1},
-        {kGbk, "\xD6", 1, -1},
-        {kGbk, "\0"s, 1, 0},
+        {kGbk, "\xD6\xD0", 2, 2}, {kGbk, "a", 1, 1}, {kGbk, "\xD6", 1, -1}, {kGbk, "\0"s, 1, 0},
+        // clang-format on
     };
     for (size_t i = 0; i < std::size(rows); ++i) {
         TRACE(i, rows[i].enc);
@@ -50,6 +44,7 @@ TEST(Routines, CaseMappingInPlaceKeepsTheByteLength) {
         bool upper;
         std::string text, expected;
     } rows[] = {
+        // clang-format off
         {kUtf8, true, "a\xC4\xB1z", "AIZ "},  // the dotless i upper-cases to one byte
         {kUtf8, false, "\xC4\xB0X", "ix "},   // capital I with dot lower-cases to one byte
         {kUtf8, true, "stra\xC3\x9F\x65 \xC3\xA9t\xC3\xA9", "STRA\xC3\x9F\x45 \xC3\x89T\xC3\x89"},
@@ -59,6 +54,7 @@ TEST(Routines, CaseMappingInPlaceKeepsTheByteLength) {
         {kCp1252, true, "\xB5m", "\xB5M"},  // micro's capital is not in cp1252: kept, not "?"
         {kLatin1, true, "\xFF\xE0", "\xFF\xC0"},
         {kGbk, true, "a\xD6\xD0\x62", "A\xD6\xD0\x42"},
+        // clang-format on
     };
     for (size_t i = 0; i < std::size(rows); ++i) {
         TRACE(i, rows[i].enc);
@@ -78,11 +74,13 @@ TEST(Routines, CaseMappingIntoABoundedDestination) {
         std::string dst;
         int error;
     } rows[] = {
+        // clang-format off
         {kUtf8, true, "a\xC3\xA9\x62\0"s, -1, 4, 4, "A\xC3\x89\x42", 0},
         {kUtf8, true, "a\xC3\xA9\0"s, -1, 2, 1, "A\0"s, 1},  // a character that does not fit
         {kUtf8, false, "abc\xC3", 4, 8, 4, "abc\xC3", 3},
         {kUtf8, false, "ABC", 2, 8, 2, "ab\0"s, 0},
         {kLatin1, false, "\xC0\xC9\0"s, -1, 4, 2, "\xE0\xE9\0"s, 0},
+        // clang-format on
     };
     for (size_t i = 0; i < std::size(rows); ++i) {
         const auto& r = rows[i];
@@ -110,11 +108,11 @@ TEST(Routines, EqualAndCompareIgnoringCase) {
         std::string b;
         int lenB, equal, error;
     } rows[] = {
+        // clang-format off
         {kUtf8, "WITH\0"s, -1, "with\0"s, -1, 1, 0},
         {kUtf8, "with\0"s, -1, "withx\0"s, -1, 0, 0},
         {kUtf8, "\xC3\x84\xC3\x96\0"s, -1, "\xC3\xA4\xC3\xB6\0"s, -1, 1, 0},
-        {kUtf8, "ABC", 3, "abcd", 3, 1, 0},
-        {kUtf8, "ABC", 3, "abcd", 4, 0, 0},
+        {kUtf8, "ABC", 3, "abcd", 3, 1, 0}, {kUtf8, "ABC", 3, "abcd", 4, 0, 0},
         // A lead byte at the end of the given length is malformed, not a character.
         {kUtf8, "a\xC3\xA9", 2, "A\xC3\0"s, -1, 1, 3},
         {kUtf8, "\xC3\xA9\0"s, -1, "\xC3\0"s, -1, 0, 3},
@@ -123,6 +121,7 @@ TEST(Routines, EqualAndCompareIgnoringCase) {
         {kCp1252, "\xC4RGER\0"s, -1, "\xE4rger\0"s, -1, 1, 0},
         {kGbk, "ABC\xD6\xD0\0"s, -1, "abc\xD6\xD0\0"s, -1, 1, 0},
         {kGbk, "ab\xD6", 3, "AB\xD6\0"s, -1, 1, 3},
+        // clang-format on
     };
     for (size_t i = 0; i < std::size(rows); ++i) {
         const auto& r = rows[i];
@@ -163,10 +162,12 @@ TEST(Routines, TruncateAndFindLastCharRespectCharacters) {
         int n;
         std::string expected;
     } cuts[] = {
+        // clang-format off
         {kUtf8, "ab\xC3\xA9z", 3, "ab"},         {kUtf8, "ab\xC3\xA9z", 4, "ab\xC3\xA9"},
         {kUtf8, "ab\xC3\xA9", 40, "ab\xC3\xA9"}, {kUtf8, "\xE4\xB8\xADx", 2, ""},
         {kUtf8, "a\xFF\x62", 2, "a\xFF"},        {kCp1252, "\x80\x80\x80", 2, "\x80\x80"},
         {kGbk, "a\xD6\xD0\xCE\xC4", 2, "a"},     {kGbk, "a\xD6\xD0\xCE\xC4", 4, "a\xD6\xD0"},
+        // clang-format on
     };
     for (size_t i = 0; i < std::size(cuts); ++i) {
         TRACE(i, cuts[i].enc);
@@ -181,15 +182,14 @@ TEST(Routines, TruncateAndFindLastCharRespectCharacters) {
         UChar32 c;
         int at;  // -1: not found
     } finds[] = {
-        {kUtf8, "a.b.c", '.', 3},
-        {kUtf8, "\xC3\xA9.\xC3\xA9x", 0xE9, 3},
-        {kUtf8, "\xC3\xA9.\xC3\xA9x", 0x4E2D, -1},
-        {kUtf8, "a\xFF", -1, -1},
+        // clang-format off
+        {kUtf8, "a.b.c", '.', 3}, {kUtf8, "\xC3\xA9.\xC3\xA9x", 0xE9, 3},
+        {kUtf8, "\xC3\xA9.\xC3\xA9x", 0x4E2D, -1}, {kUtf8, "a\xFF", -1, -1},
         {kCp1252, "\xE9x\xE9y", 0xE9, 2},
         // 0x81 0x5C is one character whose trail byte is the backslash.
-        {kGbk, "x\\\x81\x5C", '\\', 1},
-        {kGbk, "\x81\x5C", '\\', -1},
+        {kGbk, "x\\\x81\x5C", '\\', 1}, {kGbk, "\x81\x5C", '\\', -1},
         {kGbk, "\xD6\xD0x\xD6\xD0", 0x4E2D, 3},
+        // clang-format on
     };
     for (size_t i = 0; i < std::size(finds); ++i) {
         const auto& r = finds[i];
@@ -227,15 +227,14 @@ TEST(Routines, CopiesCutAtCharactersAndFill) {
         int srcLen;
         std::string field;  // its size is the size given
     } padded[] = {
-        {kUtf8, "abc", 3, "abc     "},
-        {kUtf8, "ab\xC3\xA9", 4, "ab "},
+        // clang-format off
+        {kUtf8, "abc", 3, "abc     "}, {kUtf8, "ab\xC3\xA9", 4, "ab "},
         {kUtf8, "ab\xC3\xA9", 3, "ab      "},  // the length cuts the character
         {kUtf8, "ab\xC3\xA9", 4, "ab\xC3\xA9    "},
         {kUtf8, "a\xFF\x62\0"s, -1, "a\xFF\x62     "},
-        {kGbk, "a\xD6\xD0\0"s, -1, "a "},
-        {kGbk, "a\xD6\xD0", 2, "a   "},
-        {kGbk, "a\xD6\xD0", 3, "a\xD6\xD0 "},
-        {kGbk, "\xFF\x61\0"s, -1, "\xFF\x61  "},
+        {kGbk, "a\xD6\xD0\0"s, -1, "a "}, {kGbk, "a\xD6\xD0", 2, "a   "},
+        {kGbk, "a\xD6\xD0", 3, "a\xD6\xD0 "}, {kGbk, "\xFF\x61\0"s, -1, "\xFF\x61  "},
+        // clang-format on
     };
     for (size_t i = 0; i < std::size(padded); ++i) {
         const auto& r = padded[i];
