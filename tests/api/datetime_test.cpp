@@ -25,7 +25,7 @@ struct Row {
     Call call;
     double in[4];
     int status;
-    double out[4];
+    double out[4] = {};
 };
 
 int Convert(const Row& r, double out[4]) {
