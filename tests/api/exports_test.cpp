@@ -1,8 +1,10 @@
-// The export table against the public header and against what the built
-// shared library really exports.
+// The public interface: the export table against the header and against what
+// the built shared library really exports, and the header as callers see it.
 #include <gtest/gtest.h>
 
+#include <cstddef>
 #include <cstdio>
+#include <cstdlib>
 #include <memory>
 #include <set>
 #include <sstream>
@@ -37,79 +39,72 @@ const std::vector<Call> kCalls = {
 #undef QORA_CALL
 };
 
-std::string DecoratedName(const Call& call) { return call.name + "@" + std::to_string(call.bytes); }
-
-std::string RunCommand(const std::string& command) {
-    std::unique_ptr<FILE, int (*)(FILE*)> pipe(popen(command.c_str(), "r"), pclose);
-    if (!pipe) return "";
-    std::string output;
-    char buffer[512];
-    while (std::fgets(buffer, sizeof buffer, pipe.get())) output += buffer;
-    return output;
-}
-
-// Defined dynamic symbols of the built library, by name, with their nm type.
-std::vector<std::pair<std::string, char>> ExportedSymbols() {
-    std::vector<std::pair<std::string, char>> symbols;
-    std::istringstream lines(RunCommand("nm -D --defined-only '" QORA_LIBRARY_PATH "'"));
-    std::string line;
-    while (std::getline(lines, line)) {
-        std::istringstream fields(line);
-        std::string address, type, name;
-        if (fields >> address >> type >> name) symbols.emplace_back(name, type[0]);
-    }
-    return symbols;
-}
-
-TEST(ExportTable, HasEveryCallOnceWithTheHeadersArgumentBytes) {
+TEST(ExportTable, HasEveryCallOnceUnderItsDecoratedNameAndTheIrregularAlias) {
     ASSERT_EQ(kCalls.size(), 116u);
-    std::set<std::string> names, plains;
+    std::set<std::string> names, plains, decorated;
     for (const Call& call : kCalls) {
         EXPECT_TRUE(names.insert(call.name).second) << call.name;
         EXPECT_TRUE(plains.insert(call.plain).second) << call.plain;
+        decorated.insert(call.name + "@" + std::to_string(call.bytes));
         EXPECT_EQ(call.bytes, call.headerBytes) << call.name;
-        if (call.name != "qoraIsCompatibleEncoding") {
-            EXPECT_EQ(call.name, call.plain);
-        }
+        // The one call exported under a name that is not its plain name.
+        const bool alias = call.name == "qoraIsCompatibleEncoding";
+        EXPECT_EQ(call.plain, alias ? "qoraIsCompatibleEndoding" : call.name);
     }
-}
-
-TEST(ExportTable, KeepsTheIrregularAlias) {
-    int aliases = 0;
-    for (const Call& call : kCalls) {
-        EXPECT_NE(call.plain, "qoraIsCompatibleEncoding");
-        if (call.plain == "qoraIsCompatibleEndoding") {
-            ++aliases;
-            EXPECT_EQ(DecoratedName(call), "qoraIsCompatibleEncoding@8");
-        }
-    }
-    EXPECT_EQ(aliases, 1);
-}
-
-TEST(ExportTable, GivesTheDecoratedWindowsNames) {
-    std::set<std::string> decorated;
-    for (const Call& call : kCalls) decorated.insert(DecoratedName(call));
-    EXPECT_EQ(decorated.size(), 116u);
     for (const char* name :
-         {"qoraOpenRead@8", "qoraSysmisVal@0", "qoraConvertTime@24", "qoraSetVarNMissingValues@36",
-          "qoraGetVarNValueLabelLong@28", "qoraAddMultRespDefN@28", "qoraGetInterfaceEncoding@0"})
+         {"qoraIsCompatibleEncoding@8", "qoraOpenRead@8", "qoraSysmisVal@0", "qoraConvertTime@24",
+          "qoraSetVarNMissingValues@36", "qoraGetVarNValueLabelLong@28", "qoraAddMultRespDefN@28",
+          "qoraGetInterfaceEncoding@0"})
         EXPECT_EQ(decorated.count(name), 1u) << name;
 }
 
 TEST(ExportTable, LibraryExportsExactlyTheBuiltPlainNames) {
-    std::set<std::string> built;
+    std::set<std::string> built, exported;
     for (const Call& call : kCalls)
         if (call.built) built.insert(call.plain);
-    const auto symbols = ExportedSymbols();
-    ASSERT_FALSE(symbols.empty()) << "nm found nothing in " QORA_LIBRARY_PATH;
-    std::set<std::string> exported;
-    for (const auto& [name, type] : symbols) {
+    std::unique_ptr<FILE, int (*)(FILE*)> nm(
+        popen("nm -D --defined-only '" QORA_LIBRARY_PATH "'", "r"), pclose);
+    ASSERT_TRUE(nm);
+    char line[512];
+    while (std::fgets(line, sizeof line, nm.get())) {
+        std::istringstream fields(line);
+        std::string address, type, name;
+        if (!(fields >> address >> type >> name)) continue;
         EXPECT_EQ(built.count(name), 1u) << "exported but not a built call: " << name;
-        EXPECT_TRUE(type == 'T' || type == 'W') << name << " is not a function";
+        EXPECT_TRUE(type == "T" || type == "W") << name << " is not a function";
         exported.insert(name);
     }
+    ASSERT_FALSE(exported.empty()) << "nm found nothing in " QORA_LIBRARY_PATH;
     for (const std::string& name : built)
         EXPECT_EQ(exported.count(name), 1u) << "built but not exported: " << name;
+}
+
+TEST(PublicHeader, MultipleResponseDefinitionLayout) {
+    const size_t p = sizeof(char*);
+    const std::pair<size_t, size_t> offsets[] = {
+        {offsetof(qoraMultRespDef, label), 65},
+        {offsetof(qoraMultRespDef, isDichotomy), 324},
+        {offsetof(qoraMultRespDef, isNumeric), 328},
+        {offsetof(qoraMultRespDef, useCategoryLabels), 332},
+        {offsetof(qoraMultRespDef, useFirstVarLabel), 336},
+        {offsetof(qoraMultRespDef, reserved), 340},
+        {offsetof(qoraMultRespDef, numericCountedValue), 396},
+        {offsetof(qoraMultRespDef, countedValue), 400},
+        {offsetof(qoraMultRespDef, varNames), 400 + p},
+        {offsetof(qoraMultRespDef, numVars), 400 + 2 * p},
+        {sizeof(qoraMultRespDef), (400 + 3 * p + sizeof(int) - 1) / p * p},  // 412 for 4-byte p
+    };
+    for (size_t i = 0; i < std::size(offsets); ++i)
+        EXPECT_EQ(offsets[i].first, offsets[i].second) << "field " << i;
+}
+
+TEST(PublicHeader, CompilesAsStrictC) {
+    const std::string data = QORA_TEST_DATA_DIR;  // <source>/tests/data
+    const std::string header = data.substr(0, data.rfind("/tests/")) + "/api/qoraio32.h";
+    if (std::system("command -v cc >/dev/null 2>&1") != 0) GTEST_SKIP() << "no C compiler";
+    const std::string command =
+        "cc -std=c99 -pedantic -Wall -Wextra -Werror -fsyntax-only -x c '" + header + "'";
+    EXPECT_EQ(std::system(command.c_str()), 0) << command;
 }
 
 }  // namespace

@@ -4,6 +4,8 @@
 
 #include <cstring>
 #include <string>
+#include <tuple>
+#include <vector>
 
 #include "api_handles.h"
 #include "qoraio32.h"
@@ -19,24 +21,20 @@ class ValueLabels : public ::testing::Test {
   protected:
     void SetUp() override {
         fixture::OpenForWrite(fDir.Path() + "/out.qsf", fHandle);
-        ASSERT_EQ(qoraSetVarName(h(), "n1", 0), QORA_STATUS_OK);
-        ASSERT_EQ(qoraSetVarName(h(), "n2", 0), QORA_STATUS_OK);
-        ASSERT_EQ(qoraSetVarName(h(), "s8", 8), QORA_STATUS_OK);
-        ASSERT_EQ(qoraSetVarName(h(), "t8", 8), QORA_STATUS_OK);
-        ASSERT_EQ(qoraSetVarName(h(), "s10", 10), QORA_STATUS_OK);
+        for (auto [name, type] : {std::pair{"n1", 0}, {"n2", 0}, {"s8", 8}, {"t8", 8}, {"s10", 10}})
+            ASSERT_EQ(qoraSetVarName(h(), name, type), QORA_STATUS_OK);
     }
     int h() const { return fHandle.get(); }
-    std::string NLabel(const char* var, double value, int* status = nullptr) {
+    // The label looked up, after the status of the call.
+    std::string NLabel(const char* var, double value) {
         char label[61] = "junk";
-        const int result = qoraGetVarNValueLabel(h(), var, value, label);
-        if (status) *status = result;
-        return label;
+        const int status = qoraGetVarNValueLabel(h(), var, value, label);
+        return std::to_string(status) + "|" + label;
     }
-    std::string CLabel(const char* var, const char* value, int* status = nullptr) {
+    std::string CLabel(const char* var, const char* value) {
         char label[61] = "junk";
-        const int result = qoraGetVarCValueLabel(h(), var, value, label);
-        if (status) *status = result;
-        return label;
+        const int status = qoraGetVarCValueLabel(h(), var, value, label);
+        return std::to_string(status) + "|" + label;
     }
 
     fixture::TempDir fDir;
@@ -44,21 +42,15 @@ class ValueLabels : public ::testing::Test {
 };
 
 TEST_F(ValueLabels, SingleLabelsMergeAndLookupsTellNoLabelsFromNoLabel) {
-    int status = 0;
-    EXPECT_EQ(NLabel("n1", 1.0, &status), "");
-    EXPECT_EQ(status, QORA_WARN_NO_LABELS);
+    EXPECT_EQ(NLabel("n1", 1.0), "-8|");
     ASSERT_EQ(qoraSetVarNValueLabel(h(), "n1", 1.0, "male"), QORA_STATUS_OK);
     ASSERT_EQ(qoraSetVarNValueLabel(h(), "N1", 2.0, "female"), QORA_STATUS_OK);
     ASSERT_EQ(qoraSetVarNValueLabel(h(), "n1", 1.0, "man"), QORA_STATUS_OK);
-    EXPECT_EQ(NLabel("n1", 1.0), "man");
-    EXPECT_EQ(NLabel("n1", 2.0), "female");
-    EXPECT_EQ(NLabel("n1", 3.0, &status), "");
-    EXPECT_EQ(status, QORA_WARN_NO_LABEL);
-    EXPECT_EQ(NLabel("n2", 1.0, &status), "");
-    EXPECT_EQ(status, QORA_WARN_NO_LABELS);
     ASSERT_EQ(qoraSetVarNValueLabel(h(), "n1", 4.0, nullptr), QORA_STATUS_OK);
-    EXPECT_EQ(NLabel("n1", 4.0, &status), "");
-    EXPECT_EQ(status, QORA_STATUS_OK);
+    for (auto [value, expected] :
+         {std::pair{1.0, "0|man"}, {2.0, "0|female"}, {3.0, "-9|"}, {4.0, "0|"}})
+        EXPECT_EQ(NLabel("n1", value), expected) << value;
+    EXPECT_EQ(NLabel("n2", 1.0), "-8|");
 }
 
 TEST_F(ValueLabels, KindAndNameChecks) {
@@ -66,13 +58,9 @@ TEST_F(ValueLabels, KindAndNameChecks) {
     EXPECT_EQ(qoraSetVarCValueLabel(h(), "n1", "a", "x"), QORA_STATUS_STRING_REQUIRED);
     EXPECT_EQ(qoraSetVarNValueLabel(h(), "zz", 1.0, "x"), QORA_STATUS_VAR_NOT_FOUND);
     EXPECT_EQ(qoraSetVarCValueLabel(h(), nullptr, "a", "x"), QORA_STATUS_VAR_NOT_FOUND);
-    int status = 0;
-    EXPECT_EQ(NLabel("s8", 1.0, &status), "");
-    EXPECT_EQ(status, QORA_STATUS_NUMERIC_REQUIRED);
-    EXPECT_EQ(CLabel("n1", "a", &status), "");
-    EXPECT_EQ(status, QORA_STATUS_STRING_REQUIRED);
-    EXPECT_EQ(CLabel("zz", "a", &status), "");
-    EXPECT_EQ(status, QORA_STATUS_VAR_NOT_FOUND);
+    EXPECT_EQ(NLabel("s8", 1.0), "14|");
+    EXPECT_EQ(CLabel("n1", "a"), "15|");
+    EXPECT_EQ(CLabel("zz", "a"), "12|");
     char label[8];
     EXPECT_EQ(qoraGetVarNValueLabelLong(h(), "n1", 1.0, label, 0, nullptr),
               QORA_STATUS_BAD_FILE_HANDLE);
@@ -80,6 +68,8 @@ TEST_F(ValueLabels, KindAndNameChecks) {
     EXPECT_EQ(qoraGetVarNValueLabel(-1, "n1", 1.0, label), QORA_STATUS_BAD_FILE_HANDLE);
 }
 
+// Stored labels keep 120 bytes, the short getters hand out 60, cut at whole
+// characters in UTF-8 mode.
 TEST_F(ValueLabels, LongLabelsAreStoredCutWithAWarning) {
     EXPECT_EQ(qoraSetVarNValueLabel(h(), "n1", 1.0, std::string(130, 'x').c_str()),
               QORA_WARN_VALUE_LABEL_TRUNCATED);
@@ -88,53 +78,46 @@ TEST_F(ValueLabels, LongLabelsAreStoredCutWithAWarning) {
     ASSERT_EQ(qoraGetVarNValueLabelLong(h(), "n1", 1.0, label, sizeof label, &length),
               QORA_STATUS_OK);
     EXPECT_EQ(length, 120);
-    EXPECT_EQ(NLabel("n1", 1.0), std::string(60, 'x'));
+    EXPECT_EQ(NLabel("n1", 1.0), "0|" + std::string(60, 'x'));
     ASSERT_EQ(qoraSetVarCValueLabel(h(), "s8", "a", std::string(100, 'y').c_str()), QORA_STATUS_OK);
-    EXPECT_EQ(CLabel("s8", "a"), std::string(60, 'y'));
+    EXPECT_EQ(CLabel("s8", "a"), "0|" + std::string(60, 'y'));
     ASSERT_EQ(qoraGetVarCValueLabelLong(h(), "s8", "a", label, 6, &length), QORA_STATUS_OK);
     EXPECT_STREQ(label, "yyyyy");
     EXPECT_EQ(length, 5);
-}
 
-TEST_F(ValueLabels, Utf8LabelsAreCutAtWholeCharacters) {
     fixture::Utf8Mode utf8;
-    std::string euros;
-    for (int i = 0; i < 43; ++i) euros += "\xE2\x82\xAC";
-    const std::string label = "a" + euros;  // 130 bytes
-    EXPECT_EQ(qoraSetVarNValueLabel(h(), "n1", 1.0, label.c_str()),
+    std::string euros = "a";
+    for (int i = 0; i < 43; ++i) euros += "\xE2\x82\xAC";  // 130 bytes
+    EXPECT_EQ(qoraSetVarNValueLabel(h(), "n1", 1.0, euros.c_str()),
               QORA_WARN_VALUE_LABEL_TRUNCATED);
-    char out[200];
-    int length = 0;
-    ASSERT_EQ(qoraGetVarNValueLabelLong(h(), "n1", 1.0, out, sizeof out, &length), QORA_STATUS_OK);
-    EXPECT_EQ(std::string(out), label.substr(0, 118));
+    ASSERT_EQ(qoraGetVarNValueLabelLong(h(), "n1", 1.0, label, sizeof label, &length),
+              QORA_STATUS_OK);
+    EXPECT_EQ(label, euros.substr(0, 118));
     EXPECT_EQ(length, 118);
-    EXPECT_EQ(NLabel("n1", 1.0), label.substr(0, 58));
+    EXPECT_EQ(NLabel("n1", 1.0), "0|" + euros.substr(0, 58));
     // A 9-byte string value cut at the width of 8 keeps whole characters too.
     ASSERT_EQ(qoraSetVarCValueLabel(h(), "s8", "abc\xE2\x82\xAC\xE2\x82\xAC", "cut"),
               QORA_STATUS_OK);
-    EXPECT_EQ(CLabel("s8", "abc\xE2\x82\xAC"), "cut");
+    EXPECT_EQ(CLabel("s8", "abc\xE2\x82\xAC"), "0|cut");
 }
 
 TEST_F(ValueLabels, StringValuesArePaddedAndCutAtTheWidth) {
     ASSERT_EQ(qoraSetVarCValueLabel(h(), "s8", "abc", "three"), QORA_STATUS_OK);
-    EXPECT_EQ(CLabel("s8", "abc"), "three");
-    EXPECT_EQ(CLabel("s8", "abc   "), "three");
     ASSERT_EQ(qoraSetVarCValueLabel(h(), "s10", "0123456789XYZW", "ten"), QORA_STATUS_OK);
-    EXPECT_EQ(CLabel("s10", "0123456789"), "ten");
-    EXPECT_EQ(CLabel("s10", "0123456789Q"), "ten");
-
-    char** values = nullptr;
-    char** labels = nullptr;
-    int count = 0;
-    ASSERT_EQ(qoraGetVarCValueLabels(h(), "s8", &values, &labels, &count), QORA_STATUS_OK);
-    ASSERT_EQ(count, 1);
-    EXPECT_STREQ(values[0], "abc     ");
-    EXPECT_STREQ(labels[0], "three");
-    EXPECT_EQ(qoraFreeVarCValueLabels(values, labels, count), QORA_STATUS_OK);
-    ASSERT_EQ(qoraGetVarCValueLabels(h(), "s10", &values, &labels, &count), QORA_STATUS_OK);
-    ASSERT_EQ(count, 1);
-    EXPECT_STREQ(values[0], "0123456789      ");  // two value units
-    EXPECT_EQ(qoraFreeVarCValueLabels(values, labels, count), QORA_STATUS_OK);
+    for (auto [var, value, expected] : {std::tuple{"s8", "abc", "0|three"},
+                                        {"s8", "abc   ", "0|three"},
+                                        {"s10", "0123456789", "0|ten"},
+                                        {"s10", "0123456789Q", "0|ten"}})
+        EXPECT_EQ(CLabel(var, value), expected) << value;
+    for (auto [var, padded] : {std::pair{"s8", "abc     "}, {"s10", "0123456789      "}}) {
+        char** values = nullptr;
+        char** labels = nullptr;
+        int count = 0;
+        ASSERT_EQ(qoraGetVarCValueLabels(h(), var, &values, &labels, &count), QORA_STATUS_OK);
+        ASSERT_EQ(count, 1);
+        EXPECT_STREQ(values[0], padded);  // whole value units
+        EXPECT_EQ(qoraFreeVarCValueLabels(values, labels, count), QORA_STATUS_OK);
+    }
 }
 
 TEST_F(ValueLabels, SetFormsReplaceEveryNamedVariablesLabels) {
@@ -143,21 +126,17 @@ TEST_F(ValueLabels, SetFormsReplaceEveryNamedVariablesLabels) {
     const double values[] = {1.0, 2.0};
     const char* labels[] = {"one", "two"};
     ASSERT_EQ(qoraSetVarNValueLabels(h(), vars, 2, values, labels, 2), QORA_STATUS_OK);
-    int status = 0;
-    EXPECT_EQ(NLabel("n1", 9.0, &status), "");
-    EXPECT_EQ(status, QORA_WARN_NO_LABEL);
-    EXPECT_EQ(NLabel("n2", 2.0), "two");
+    EXPECT_EQ(NLabel("n1", 9.0), "-9|");
+    EXPECT_EQ(NLabel("n2", 2.0), "0|two");
     ASSERT_EQ(qoraSetVarNValueLabel(h(), "n1", 3.0, "three"), QORA_STATUS_OK);
-    EXPECT_EQ(NLabel("n1", 3.0), "three");
-    EXPECT_EQ(NLabel("n2", 3.0, &status), "");
-    EXPECT_EQ(status, QORA_WARN_NO_LABEL);
+    EXPECT_EQ(NLabel("n2", 3.0), "-9|");
 
     double* outValues = nullptr;
     char** outLabels = nullptr;
     int count = 0;
     ASSERT_EQ(qoraGetVarNValueLabels(h(), "n1", &outValues, &outLabels, &count), QORA_STATUS_OK);
     ASSERT_EQ(count, 3);
-    EXPECT_EQ(outValues[0] * 100 + outValues[1] * 10 + outValues[2], 123.0);
+    EXPECT_EQ(std::vector<double>(outValues, outValues + 3), (std::vector<double>{1, 2, 3}));
     EXPECT_STREQ(outLabels[2], "three");
     EXPECT_EQ(qoraFreeVarNValueLabels(outValues, outLabels, count), QORA_STATUS_OK);
 
@@ -166,7 +145,7 @@ TEST_F(ValueLabels, SetFormsReplaceEveryNamedVariablesLabels) {
     EXPECT_EQ(qoraSetVarNValueLabels(h(), bad, 2, values, labels, 2), QORA_STATUS_NUMERIC_REQUIRED);
     const char* absent[] = {"n1", "zz"};
     EXPECT_EQ(qoraSetVarNValueLabels(h(), absent, 2, values, labels, 2), QORA_STATUS_VAR_NOT_FOUND);
-    EXPECT_EQ(NLabel("n1", 3.0), "three");
+    EXPECT_EQ(NLabel("n1", 3.0), "0|three");
     const std::string longLabel(121, 'z');
     const char* cut[] = {"one", longLabel.c_str()};
     EXPECT_EQ(qoraSetVarNValueLabels(h(), vars, 2, values, cut, 2),
@@ -183,17 +162,15 @@ TEST_F(ValueLabels, StringSetFormsNeedOneWidth) {
     const char* mixed[] = {"s8", "s10"};
     ASSERT_EQ(qoraSetVarCValueLabel(h(), "s10", "q", "Q"), QORA_STATUS_OK);
     EXPECT_EQ(qoraSetVarCValueLabels(h(), mixed, 2, values, labels, 2), QORA_STATUS_WIDTH_MISMATCH);
-    int status = 0;
-    EXPECT_EQ(CLabel("s8", "a", &status), "");
-    EXPECT_EQ(status, QORA_WARN_NO_LABELS);
-    EXPECT_EQ(CLabel("s10", "q"), "Q");
+    EXPECT_EQ(CLabel("s8", "a"), "-8|");
+    EXPECT_EQ(CLabel("s10", "q"), "0|Q");
     const char* numeric[] = {"s8", "n1"};
     EXPECT_EQ(qoraSetVarCValueLabels(h(), numeric, 2, values, labels, 2),
               QORA_STATUS_STRING_REQUIRED);
     const char* same[] = {"s8", "t8"};
     ASSERT_EQ(qoraSetVarCValueLabels(h(), same, 2, values, labels, 2), QORA_STATUS_OK);
-    EXPECT_EQ(CLabel("t8", "b"), "B");
-    EXPECT_EQ(CLabel("s8", "a"), "A");
+    EXPECT_EQ(CLabel("t8", "b"), "0|B");
+    EXPECT_EQ(CLabel("s8", "a"), "0|A");
 }
 
 TEST_F(ValueLabels, ArrayCallsClearTheirOutputsOnFailure) {

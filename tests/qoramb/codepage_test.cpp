@@ -8,48 +8,41 @@ std::string NameOf(UConverter* cnv) {
     return cnv ? ucnv_getName(cnv, &err) : "";
 }
 
-std::string CodePageName(long codePage) {
-    std::string name = "untouched";
-    return CodePageToEncodingName(codePage, name) ? name : "failed:" + name;
+TEST(CodePageTable, NumbersAndNames) {
+    for (auto [codePage, expected] : {std::pair<long, const char*>{1252, "windows-1252"},
+                                      {936, "GBK"},
+                                      {932, "Shift_JIS"},
+                                      {437, "IBM437"},  // not in the table: windows-437
+                                      {65001, "UTF-8"},
+                                      {99998, "failed:"}}) {
+        std::string name = "untouched";
+        EXPECT_EQ(CodePageToEncodingName(codePage, name) ? name : "failed:" + name, expected);
+    }
+    for (auto [name, codePage] : {std::pair<const char*, long>{"windows-1252", 1252},
+                                  {"ISO-8859-1", 28591},
+                                  {"latin1", 28591},
+                                  {"UTF-8", 65001},  // from its alias windows-65001
+                                  {"GBK", 936},
+                                  {"Shift_JIS", 932},  // windows-932 before cp932
+                                  {"ibm-813", 813},    // only a cp alias
+                                  {"Windows-28591", 28591},
+                                  {"no-such-encoding", 0},
+                                  {nullptr, 0}})
+        EXPECT_EQ(EncodingNameToCodePage(name), codePage) << (name ? name : "null");
 }
 
-TEST(CodePageTable, CodePageToEncodingName) {
-    EXPECT_EQ(CodePageName(1252), "windows-1252");
-    EXPECT_EQ(CodePageName(936), "GBK");
-    EXPECT_EQ(CodePageName(932), "Shift_JIS");
-    EXPECT_EQ(CodePageName(437), "IBM437");  // not in the table: windows-437
-    EXPECT_EQ(CodePageName(65001), "UTF-8");
-    EXPECT_EQ(CodePageName(99998), "failed:");
-}
-
-TEST(CodePageTable, EncodingNameToCodePage) {
-    EXPECT_EQ(EncodingNameToCodePage("windows-1252"), 1252);
-    EXPECT_EQ(EncodingNameToCodePage("ISO-8859-1"), 28591);
-    EXPECT_EQ(EncodingNameToCodePage("latin1"), 28591);
-    EXPECT_EQ(EncodingNameToCodePage("UTF-8"), 65001);  // from its alias windows-65001
-    EXPECT_EQ(EncodingNameToCodePage("GBK"), 936);
-    EXPECT_EQ(EncodingNameToCodePage("Shift_JIS"), 932);  // windows-932 before cp932
-    EXPECT_EQ(EncodingNameToCodePage("ibm-813"), 813);    // only a cp alias
-    EXPECT_EQ(EncodingNameToCodePage("Windows-28591"), 28591);
-    EXPECT_EQ(EncodingNameToCodePage("no-such-encoding"), 0);
-    EXPECT_EQ(EncodingNameToCodePage(nullptr), 0);
-}
-
-TEST(Converters, OpenByNameNumberOrCurrent) {
+TEST(Converters, OpenCompareAndDisplay) {
     ConverterPtr byNumber(OpenConverter("1252"));
-    ConverterPtr byName(OpenConverter("windows-1252"));
-    ASSERT_TRUE(byNumber && byName);
-    EXPECT_EQ(NameOf(byNumber.get()), NameOf(byName.get()));
+    ASSERT_NE(byNumber, nullptr);
+    EXPECT_EQ(NameOf(byNumber.get()), NameOf(ConverterPtr(OpenConverter("windows-1252")).get()));
     EXPECT_EQ(ConverterPtr(OpenConverter("123456")), nullptr);  // a name, not a number
     EXPECT_EQ(ConverterPtr(OpenConverter("99998")), nullptr);
-    ConverterPtr latin1(OpenConverter("windows-28591"));
-    EXPECT_EQ(NameOf(latin1.get()), "ISO-8859-1");
-    EncodingScope scope("C", "GBK", 0);
-    ConverterPtr current(OpenConverter(nullptr));
-    EXPECT_EQ(NameOf(current.get()), NameOf(CurrentConverter()));
-}
+    EXPECT_EQ(NameOf(ConverterPtr(OpenConverter("windows-28591")).get()), "ISO-8859-1");
+    {
+        EncodingScope scope({"C", "GBK", 0});
+        EXPECT_EQ(NameOf(ConverterPtr(OpenConverter(nullptr)).get()), NameOf(CurrentConverter()));
+    }
 
-TEST(Converters, DisplayNames) {
     for (auto [name, shown] : {std::pair{"Shift_JIS", "windows-31j"},
                                {"cp1252", "windows-1252"},
                                {"GBK", "GBK"},
@@ -60,11 +53,9 @@ TEST(Converters, DisplayNames) {
         ASSERT_NE(cnv, nullptr) << name;
         EXPECT_EQ(EncodingDisplayName(cnv.get()), shown) << name;
     }
-    EncodingScope scope("C", "ISO-8859-1", 0);
+    EncodingScope scope({"C", "ISO-8859-1", 0});
     EXPECT_EQ(EncodingDisplayName(nullptr), "ISO_8859-1:1987");
-}
 
-TEST(Converters, SameEncoding) {
     EXPECT_TRUE(IsSameEncoding("cp1252", "windows-1252"));
     EXPECT_TRUE(IsSameEncoding("GBK", "CP936"));
     EXPECT_FALSE(IsSameEncoding("cp1252", "ISO-8859-1"));
@@ -73,65 +64,60 @@ TEST(Converters, SameEncoding) {
 }
 
 TEST(Locale, LocaleStringNeedsRoomForTheTerminator) {
-    EncodingScope scope("C", "cp1252", 0);
+    EncodingScope scope({"C", "cp1252", 0});
     ASSERT_TRUE(SetCollatorLocale("de_DE"));
     EXPECT_FALSE(SetCollatorLocale("de@collation=no;such=thing;;"));
-    std::string expected = "de.windows-1252";
-    auto exact = Exact(std::string(expected.size() + 1, 'x'));
-    EXPECT_EQ(GetLocaleString(exact.get(), static_cast<int>(expected.size())), 0);
+    const std::string expected = "de.windows-1252";
+    const int size = static_cast<int>(expected.size());
+    auto exact = Exact(std::string(size + 1, 'x'));
+    EXPECT_EQ(GetLocaleString(exact.get(), size), 0);
     EXPECT_EQ(exact[0], 'x');
-    EXPECT_EQ(GetLocaleString(exact.get(), static_cast<int>(expected.size() + 1)),
-              static_cast<int>(expected.size()));
+    EXPECT_EQ(GetLocaleString(exact.get(), size + 1), size);
     EXPECT_STREQ(exact.get(), expected.c_str());
     EXPECT_EQ(GetLocaleString(nullptr, 100), 0);
 }
 
 TEST(Locale, IsoCodesFromPosixAndWindowsNames) {
-    std::string language, country;
-    auto codes = [&](const char* name) {
+    for (auto [name, expected] : {std::pair<const char*, const char*>{"de_DE.UTF-8", "de|DE"},
+                                  {"German_Germany.1252", "de|DE"},
+                                  {"german_austria.1252", "de|AT"},
+                                  {"en_US.ISO-8859-1", "en|US"},
+                                  {"zh_CN.GBK", "zh|CN"},
+                                  {"Chinese_Taiwan.950", "zh|TW"},
+                                  {"fr_CA", "fr|CA"},
+                                  {"de_DE@euro", "de|DE"},
+                                  {"French_.1252", "fr|"},
+                                  {"de_XX.UTF-8", "en|"},
+                                  {"C", "en|"},
+                                  {nullptr, "en|"}}) {
+        std::string language, country;
         LocaleNameToIsoCodes(name, language, country);
-        return language + "|" + country;
-    };
-    EXPECT_EQ(codes("de_DE.UTF-8"), "de|DE");
-    EXPECT_EQ(codes("German_Germany.1252"), "de|DE");
-    EXPECT_EQ(codes("german_austria.1252"), "de|AT");
-    EXPECT_EQ(codes("en_US.ISO-8859-1"), "en|US");
-    EXPECT_EQ(codes("zh_CN.GBK"), "zh|CN");
-    EXPECT_EQ(codes("Chinese_Taiwan.950"), "zh|TW");
-    EXPECT_EQ(codes("fr_CA"), "fr|CA");
-    EXPECT_EQ(codes("de_DE@euro"), "de|DE");
-    EXPECT_EQ(codes("French_.1252"), "fr|");
-    EXPECT_EQ(codes("de_XX.UTF-8"), "en|");
-    EXPECT_EQ(codes("C"), "en|");
-    EXPECT_EQ(codes(nullptr), "en|");
+        EXPECT_EQ(language + "|" + country, expected) << (name ? name : "null");
+    }
+    EncodingScope scope({"de_DE.UTF-8", "UTF-8", 0});
+    std::string language, country;
+    LocaleToIsoCodes(language, country);
+    EXPECT_EQ(language + "|" + country, "de|DE");
 }
 
 TEST(Locale, SystemLocaleInfo) {
-    std::string locale, encoding;
-    {
-        EncodingScope scope("de_DE.UTF-8", "UTF-8", 0);
-        EXPECT_TRUE(GetSystemLocaleInfo(locale, encoding));
-        EXPECT_EQ(locale, "de");
-        EXPECT_EQ(encoding, "UTF-8");
-        std::string language, country;
-        LocaleToIsoCodes(language, country);
-        EXPECT_EQ(language + "|" + country, "de|DE");
+    const struct {
+        Encoding enc;
+        bool found;
+        const char *locale, *encoding;
+    } rows[] = {
+        {{"de_DE.UTF-8", "UTF-8", 0}, true, "de", "UTF-8"},
+        {kGbk, true, "zh_Hans_CN", "GBK"},
+        {kLatin1, true, "en_US", "ISO_8859-1:1987"},
+        {{"C", "ISO-8859-1", 0}, false, "", ""},
+    };
+    for (const auto& r : rows) {
+        EncodingScope scope(r.enc);
+        std::string locale = "x", encoding = "x";
+        EXPECT_EQ(GetSystemLocaleInfo(locale, encoding), r.found) << r.enc.locale;
+        EXPECT_EQ(locale, r.locale);
+        EXPECT_EQ(encoding, r.encoding);
     }
-    {
-        EncodingScope scope("zh_CN.GBK", "GBK", 0);
-        EXPECT_TRUE(GetSystemLocaleInfo(locale, encoding));
-        EXPECT_EQ(locale, "zh_Hans_CN");
-        EXPECT_EQ(encoding, "GBK");
-    }
-    {
-        EncodingScope scope("en_US.ISO-8859-1", "ISO-8859-1", 0);
-        EXPECT_TRUE(GetSystemLocaleInfo(locale, encoding));
-        EXPECT_EQ(locale, "en_US");
-        EXPECT_EQ(encoding, "ISO_8859-1:1987");
-    }
-    EncodingScope scope("C", "ISO-8859-1", 0);
-    EXPECT_FALSE(GetSystemLocaleInfo(locale, encoding));
-    EXPECT_EQ(locale + encoding, "");
 }
 
 }  // namespace

@@ -13,16 +13,28 @@
 #include "codepage.h"
 #include "qoramb.h"
 
+using namespace std::string_literals;
+
+// A runtime locale, a name for SetCodePageConverter and the interface mode.
+struct Encoding {
+    const char* locale;
+    const char* converter;
+    int utf8Mode;
+};
+constexpr Encoding kUtf8{"en_US.UTF-8", "UTF-8", 1};
+constexpr Encoding kCp1252{"de_DE.CP1252", "cp1252", 0};
+constexpr Encoding kLatin1{"en_US.ISO-8859-1", "ISO-8859-1", 0};
+constexpr Encoding kGbk{"zh_CN.GBK", "GBK", 0};
+
 class EncodingScope {
   public:
-    // locale: a runtime locale name; converter: a name for SetCodePageConverter.
-    EncodingScope(const char* locale, const char* converter, int utf8Mode)
+    explicit EncodingScope(const Encoding& e)
         : fLocale(setlocale(LC_ALL, nullptr)),
           fConverter(ucnv_getName(CurrentConverter(), &fErr)),
           fMode(mbIsUtf8Mode()) {
-        if (!setlocale(LC_ALL, locale)) ADD_FAILURE() << "locale missing: " << locale;
-        EXPECT_TRUE(SetCodePageConverter(converter)) << converter;
-        mbSetUtf8Mode(utf8Mode);
+        if (!setlocale(LC_ALL, e.locale)) ADD_FAILURE() << "locale missing: " << e.locale;
+        EXPECT_TRUE(SetCodePageConverter(e.converter)) << e.converter;
+        mbSetUtf8Mode(e.utf8Mode);
     }
     ~EncodingScope() {
         setlocale(LC_ALL, fLocale.c_str());
@@ -37,7 +49,7 @@ class EncodingScope {
     int fMode;
 };
 
-// The bytes of text in a heap block of exactly their size, without terminator.
+// The bytes in a heap block of exactly their size, without terminator.
 inline std::unique_ptr<char[]> Exact(const std::string& bytes) {
     std::unique_ptr<char[]> block(new char[bytes.size()]);
     memcpy(block.get(), bytes.data(), bytes.size());
