@@ -199,15 +199,6 @@ TEST_P(CaseCallsTest, DataEndingInsideACaseFailsTheRead) {
     ExpectValues(1);
 }
 
-TEST_P(CaseCallsTest, AFirstCaseCutShortFailsEveryRead) {
-    // Only part of the first case is there.
-    StandardCases(b, 1);
-    const Bytes bytes = b.Build();
-    handle = OpenCases(b.WriteTemp(Truncated(bytes, b.DataStart() + 3), "cut.qsf"));
-    EXPECT_EQ(qoraReadCaseRecord(handle), QORA_STATUS_READ_FAILED);
-    EXPECT_EQ(qoraReadCaseRecord(handle), QORA_STATUS_READ_FAILED);
-}
-
 TEST(CaseCalls, HandlesModesAndAMissingReaderGiveTheirStatus) {
     double value;
     char text[4];

@@ -60,24 +60,6 @@ TEST(DechunkerTest, NulsAtTheEndOfAFullSegmentAreDropped) {
     EXPECT_EQ(Rebuilt(plan, raw, 38), std::string(253, 'a') + std::string(47, 'b') + "    ");
 }
 
-TEST(DechunkerTest, FullSegmentsGive255BytesWhenNoneIsNul) {
-    Units raw(38);
-    raw.Put(0, std::string(255, 'a'));
-    raw.Put(256, std::string(45, 'b'));
-    SystemFileDechunker plan;
-    plan.Add(SystemFileDechunker::StringEntry(0, 300, 0, 0));
-    EXPECT_EQ(Rebuilt(plan, raw, 38), std::string(255, 'a') + std::string(45, 'b') + "    ");
-}
-
-TEST(DechunkerTest, AWidthOfTwoFullSegmentsHasNoShortLastSegment) {
-    Units raw(64);
-    raw.Put(0, std::string(255, 'a'));
-    raw.Put(256, std::string(249, 'b'));
-    SystemFileDechunker plan;
-    plan.Add(SystemFileDechunker::StringEntry(0, 504, 0, 0));
-    EXPECT_EQ(Rebuilt(plan, raw, 63), std::string(255, 'a') + std::string(249, 'b'));
-}
-
 // A (numeric), S (width 300), B (numeric): the leading entry copies A, the
 // entry of S copies B after the string.
 TEST(DechunkerTest, LeadingAndOrdinaryUnitsAreCopiedUnchanged) {

@@ -184,13 +184,6 @@ TEST_P(SystemFileIteratorTest, RandomSeeksOverManyCasesFindTheirCases) {
     EXPECT_FALSE(it->ReadCase());
 }
 
-TEST_P(SystemFileIteratorTest, AFileWithoutVariablesHasNoCases) {
-    source = OpenFixture(b.WriteTemp());
-    it.reset(source->NewIterator(nullptr));
-    EXPECT_FALSE(it->ReadCase());
-    EXPECT_EQ(source->CaseCount(), 0);
-}
-
 // The plan comes from the very long strings record; here it is installed
 // as that record's handler would.
 TEST_P(SystemFileIteratorTest, VeryLongStringsAreJoinedFromTheirSegments) {
