@@ -3,6 +3,8 @@
 #include <gtest/gtest.h>
 
 #include <cstring>
+#include <iomanip>
+#include <sstream>
 #include <string>
 #include <vector>
 
@@ -17,16 +19,25 @@ class Reader : public ByteOrders {};
 INSTANTIATE_TEST_SUITE_P(Orders, Reader, ::testing::Values(Endian::Native, Endian::Swapped),
                          EndianName);
 
-std::vector<double> MissingNumbers(const QORA_Variable& var) {
-    double v[3] = {};
-    const int code = var.GetMissingValues(&v[0], &v[1], &v[2]);
-    return std::vector<double>(v, v + std::abs(code));
-}
-
-std::string Slot(const QORA_Variable& var, int k) {
-    char v[3][8];
-    var.GetMissingValues(v[0], v[1], v[2]);
-    return std::string(v[k], 8);
+// A variable on one line: name|type|label|missing code|missing values|print|write.
+std::string Describe(const QORA_Variable& var) {
+    std::ostringstream out;
+    out << std::setprecision(17) << var.GetName() << "|" << var.GetType() << "|"
+        << (var.GetLabel() ? var.GetLabel() : "(none)") << "|" << var.GetMissingCode() << "|";
+    double numbers[3];
+    char texts[3][8];
+    const int code = var.GetType() == 0
+                         ? var.GetMissingValues(&numbers[0], &numbers[1], &numbers[2])
+                         : var.GetMissingValues(texts[0], texts[1], texts[2]);
+    for (int k = 0; k < std::abs(code); ++k) {
+        if (var.GetType() == 0)
+            out << numbers[k] << " ";
+        else
+            out << std::string(texts[k], 8) << ",";
+    }
+    for (const QORA_Format& f : {var.GetPrintFormat(), var.GetWriteFormat()})
+        out << "|" << f.code << "." << f.width << "." << f.decimals;
+    return out.str();
 }
 
 }  // namespace
@@ -101,24 +112,14 @@ TEST_P(Reader, VariablesKeepTheirPropertiesAndUnits) {
     EXPECT_EQ(source->ValueCount(), 1 + 3 + 1 + 1 + 1);
     EXPECT_EQ(source->ValueOffset(2), 4);
 
-    const QORA_Variable& age = source->GetVariable(0);
-    EXPECT_EQ(age.GetName(), "age");
-    EXPECT_STREQ(age.GetLabel(), "Age");
-    EXPECT_EQ(MissingNumbers(age), (std::vector<double>{-1.0, 99.0}));
-
-    const QORA_Variable& name = source->GetVariable(1);
-    EXPECT_EQ(name.GetType(), 20);
-    EXPECT_STREQ(name.GetLabel(), "Name in full");
-    EXPECT_EQ(name.GetPrintFormat(), (QORA_Format{1, 20, 0}));
-    EXPECT_EQ(Slot(name, 0) + Slot(name, 1), "none    N/A     ");
-
-    const QORA_Variable& income = source->GetVariable(2);
-    EXPECT_EQ(income.GetMissingCode(), -3);
-    EXPECT_EQ(MissingNumbers(income), (std::vector<double>{1.0, 5.0, 9.0}));
-    EXPECT_EQ(income.GetPrintFormat(), (QORA_Format{5, 12, 3}));
-    EXPECT_EQ(income.GetWriteFormat(), (QORA_Format{3, 10, 1}));
-    EXPECT_STREQ(source->GetVariable(3).GetLabel(), "12345678");
-    EXPECT_EQ(MissingNumbers(source->GetVariable(4)), (std::vector<double>{kSysmis, 10.0}));
+    const char* expected[] = {
+        "age|0|Age|2|-1 99 |5.8.2|5.8.2",
+        "name|20|Name in full|2|none    ,N/A     ,|1.20.0|1.20.0",
+        "income|0|(none)|-3|1 5 9 |5.12.3|3.10.1",
+        "code|8|12345678|0||1.8.0|1.8.0",
+        "score|0|(none)|-2|-1.7976931348623157e+308 10 |5.8.2|5.8.2",
+    };
+    for (int i = 0; i < 5; ++i) EXPECT_EQ(Describe(source->GetVariable(i)), expected[i]);
 }
 
 TEST_P(Reader, ValueLabelSetsAreSharedAndTyped) {
@@ -272,25 +273,19 @@ TEST_P(Reader, ThousandVariablesReadBackExactly) {
     ASSERT_EQ(source->ColumnCount(), 1000);
     EXPECT_EQ(source->ValueCount(), b.CaseUnits());
     for (int i = 0; i < 1000; ++i) {
+        const std::string n = std::to_string(i);
         const QORA_Variable& var = source->GetVariable(i);
-        ASSERT_EQ(var.GetName(), "v" + std::to_string(i));
-        EXPECT_EQ(source->ValueOffset(i) + 1, b.Slot("V" + std::to_string(i)));
-        switch (i % 4) {
-            case 0:
-                EXPECT_STREQ(var.GetLabel(), ("Number " + std::to_string(i)).c_str());
-                EXPECT_EQ(MissingNumbers(var), std::vector<double>{double(i)});
-                EXPECT_EQ(*var.GetValueLabels().Lookup(double(i)), "L" + std::to_string(i));
-                break;
-            case 1:
-                EXPECT_EQ(var.GetType(), 1 + i % 255);
-                EXPECT_EQ(var.GetLabel(), std::string(i % 200, 'x'));
-                break;
-            case 2:
-                EXPECT_EQ(var.GetMissingCode(), -2);
-                EXPECT_EQ(MissingNumbers(var), (std::vector<double>{-double(i), double(i)}));
-                break;
-            default:
-                EXPECT_EQ(Slot(var, 0), ("m" + std::to_string(i % 100) + "      ").substr(0, 8));
+        EXPECT_EQ(source->ValueOffset(i) + 1, b.Slot("V" + n));
+        const std::string x = std::string(i % 200, 'x'), width = std::to_string(1 + i % 255);
+        const std::string expected[] = {
+            "v" + n + "|0|Number " + n + "|1|" + n + " |5.8.2|5.8.2",
+            "v" + n + "|" + width + "|" + x + "|0||1." + width + ".0|1." + width + ".0",
+            "v" + n + "|0|(none)|-2|-" + n + " " + n + " |5.8.2|5.8.2",
+            "v" + n + "|8|(none)|1|" + ("m" + std::to_string(i % 100) + "      ").substr(0, 8) +
+                ",|1.8.0|1.8.0"};
+        ASSERT_EQ(Describe(var), expected[i % 4]);
+        if (i % 4 == 0) {
+            EXPECT_EQ(*var.GetValueLabels().Lookup(double(i)), "L" + n);
         }
     }
 }
