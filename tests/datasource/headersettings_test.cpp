@@ -33,13 +33,3 @@ TEST(CreationStamp, CountsSecondsFromTheGregorianStart) {
     // A day beyond its month's length is taken as it stands.
     EXPECT_GT(Stamp("31 Feb 26", "00:00:00"), 0.0);
 }
-
-TEST(HeaderSettings, SeenFlagsCoverSubtypesBelowAHundred) {
-    HeaderSettings s;
-    EXPECT_TRUE(s.fRecordsSeen.none());
-    for (int32_t subtype : {99, 100, -1}) s.NoteSeen(subtype);
-    EXPECT_TRUE(s.HasSeen(99));
-    EXPECT_FALSE(s.HasSeen(100));
-    EXPECT_FALSE(s.HasSeen(-1));
-    EXPECT_EQ(s.fRecordsSeen.count(), 1u);
-}

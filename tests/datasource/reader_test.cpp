@@ -71,6 +71,7 @@ TEST_P(Reader, HeaderFieldsReachTheSettingsAndTheSource) {
     EXPECT_STREQ(source->GetIdString(), "Survey 2026");
     EXPECT_EQ(source->GetTimeStamp(), 14015783803.0);  // 04 Dec 26 17:16:43
     EXPECT_EQ(source->GetFileName(), path);
+    EXPECT_EQ(source->CaseCountRecordPosition(), 0);  // no such record
 
     b.header().caseCount = -1;
     b.header().date = " 4 Dec 26";  // unreadable: the stamp stays as made
