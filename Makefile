@@ -1,7 +1,8 @@
 # Two entry points for a fresh Debian 12 machine (run as root, or with sudo
-# rights for the package step): `make run` and `make test`.
+# rights for the package step): `make run` and `make test`; `make fuzz` and
+# `make bench` for the fuzz run and the benchmarks.
 JOBS ?= $(shell nproc)
-PACKAGES := cmake make g++ clang libicu-dev libgtest-dev libgmock-dev libbenchmark-dev locales
+PACKAGES := cmake make g++ clang libclang-rt-14-dev libicu-dev libgtest-dev libgmock-dev libbenchmark-dev locales
 SUDO := $(shell [ "$$(id -u)" = 0 ] || echo sudo)
 
 .PHONY: run test deps build build-asan locales bench fuzz clean
@@ -26,11 +27,28 @@ build-asan: deps
 	cmake --build build-asan -j $(JOBS)
 
 run: build
-	./build/tools/qoradates
+	./build/tools/qoradump examples/sample.qsf
 
 test: build build-asan locales
 	cd build && ctest --output-on-failure -j $(JOBS)
 	cd build-asan && ASAN_OPTIONS=detect_leaks=1 ctest --output-on-failure -j $(JOBS)
 
+# Seeds from the fixture builder, then a bounded run of the fuzzer; new
+# inputs collect in build-fuzz/corpus, crashes in build-fuzz/artifacts.
+FUZZ_TIME ?= 60
+fuzz: deps
+	CC=clang CXX=clang++ cmake -S . -B build-fuzz -DCMAKE_BUILD_TYPE=RelWithDebInfo -DQORA_FUZZ=ON >/dev/null
+	cmake --build build-fuzz -j $(JOBS) --target open_read_fuzz fuzz_seeds
+	mkdir -p build-fuzz/seeds build-fuzz/corpus build-fuzz/artifacts
+	./build-fuzz/tests/fuzz/fuzz_seeds build-fuzz/seeds
+	./build-fuzz/tests/fuzz/open_read_fuzz -max_total_time=$(FUZZ_TIME) -max_len=65536 \
+	  -timeout=10 -rss_limit_mb=4096 -print_final_stats=1 \
+	  -artifact_prefix=build-fuzz/artifacts/ build-fuzz/corpus build-fuzz/seeds
+
+bench: deps
+	cmake -S . -B build-bench -DCMAKE_BUILD_TYPE=Release -DQORA_BENCH=ON -DQORA_TESTS=OFF >/dev/null
+	cmake --build build-bench -j $(JOBS) --target qora_bench
+	./build-bench/bench/qora_bench
+
 clean:
-	rm -rf build build-asan
+	rm -rf build build-asan build-fuzz build-bench

@@ -11,10 +11,6 @@
 
 namespace {
 
-// The system file's case iterator comes with case reading; until then
-// NewIterator gives no reader, and an open must not fail for it.
-constexpr bool kCaseReaderAvailable = false;
-
 const char kWriterProduct[] = "@(#) QORA DATA FILE MS Windows Release 16.0 qoraio32.dll";
 
 std::unique_ptr<QORA_DataSource> NewDataSource(OpenMode mode, const char* fileName) {
@@ -45,7 +41,7 @@ int PrepareForReading(int handle) {
         entry.fpCaseBuffer.reset(new (std::nothrow) double[size_t(source.ValueCount())]);
         if (!entry.fpCaseBuffer) return QORA_STATUS_NO_MEMORY;
         entry.fpCaseReader.reset(source.NewIterator(entry.fpCaseBuffer.get()));
-        if (!entry.fpCaseReader && kCaseReaderAvailable) return QORA_STATUS_NO_MEMORY;
+        if (!entry.fpCaseReader) return QORA_STATUS_NO_MEMORY;
         return QORA_STATUS_OK;
     });
 }

@@ -218,15 +218,18 @@ uint32_t CompressedSystemFile::ReadCase(void* units, const unsigned char* swapMa
     Position();
     if (fAtEnd) return 0;
     const int64_t start = Tell();
+    const int64_t previousStart = fLastCaseStart;
     fIndex->Offer(fCurrent, start);
     fLastCaseStart = start;
     ++fRequested;
     ++fCurrent;
     const uint32_t n = Decode<true>(static_cast<unsigned char*>(units), swapMask);
-    // At the end the stream still stands before the case it could not read.
+    // At the end the stream still stands before the case it could not read,
+    // and the case read last is still the one before it.
     if (n == 0) {
         --fRequested;
         --fCurrent;
+        fLastCaseStart = previousStart;
     }
     return n;
 }

@@ -7,9 +7,12 @@
 #include <bitset>
 #include <cstddef>
 #include <cstdint>
+#include <memory>
 #include <string>
 #include <utility>
 #include <vector>
+
+#include "SystemFileDechunker.h"
 
 class QORA_DataSource;
 
@@ -38,6 +41,8 @@ struct HeaderSettings {
     std::vector<std::pair<std::string, std::string>> fNameList;
     // Flag s: a type 7 record of subtype s was read; flag 0: documents were.
     std::bitset<eMaxSeenSubtype> fRecordsSeen;
+    // Joins very long strings from their segments; null when the file has none.
+    std::unique_ptr<SystemFileDechunker> fpDechunker;
     // One byte per value unit, 1 for a unit holding a number; made only for a
     // file in the opposite byte order, and always as long as the dictionary's
     // case, whatever the header claims.

@@ -390,8 +390,15 @@ void SystemFileDataSource::Read() {
     fDataStart = fStream.Tell();
 }
 
-QORA_InputCaseIterator* SystemFileDataSource::NewIterator(void*) {
-    return nullptr;  // the case iterator comes with case reading
+QORA_InputCaseIterator* SystemFileDataSource::NewIterator(void* buffer) {
+    if (fState != kReading) {
+        // A file written by this source is read back from its start; the
+        // finishing of the writing joins with the writer.
+        const char* name = fStream.Name();
+        if (name == nullptr || !fStream.Open(name, "rb")) RaiseError(kErrCannotOpen, GetFileName());
+        fState = kReading;
+    }
+    return new Iterator(*this, buffer);
 }
 
 bool SystemFileDataSource::GetReleaseInfo(int* major, int* minor, int* revision) const {

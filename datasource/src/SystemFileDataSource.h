@@ -8,8 +8,12 @@
 #include <string>
 
 #include "HeaderSettings.h"
+#include "case.h"
 #include "datasrc.h"
 #include "filestream.h"
+#include "sparsefileindex.h"
+
+class CompressedSystemFile;
 
 // A data source that keeps its cases in a file of its own.
 class IndependentDataStore : public QORA_DataSource {
@@ -29,6 +33,7 @@ class WarningSink {
 class SystemFileDataSource : public IndependentDataStore {
   public:
     enum State { kNothingYet = 0, kWriting = 1, kReading = 2 };
+    class Iterator;
 
     // An empty source for a file that is to be written.
     SystemFileDataSource();
@@ -39,7 +44,7 @@ class SystemFileDataSource : public IndependentDataStore {
     explicit SystemFileDataSource(const char* fileName);
     ~SystemFileDataSource() override;
 
-    // The case iterator joins with case reading.
+    // A reader of the cases with a stream of its own.
     QORA_InputCaseIterator* NewIterator(void* buffer) override;
     int64_t CaseCount() const override { return fSettings.fCaseCount; }
     void SetCompression(bool on) override { fSettings.fCompressed = on; }
@@ -60,6 +65,10 @@ class SystemFileDataSource : public IndependentDataStore {
     int64_t DataStart() const { return fDataStart; }
     // 0 when the file has no case-count record.
     int64_t CaseCountRecordPosition() const { return fCaseCountRecordPos; }
+    // Where cases start in compressed data, shared by all iterators.
+    SparseFileIndex& Index() { return fIndex; }
+    // The case iterators that exist over this source.
+    int32_t LiveIterators() const { return fLiveIterators; }
 
   private:
     // Header, dictionary records and the repairs, up to the case data.
@@ -70,6 +79,50 @@ class SystemFileDataSource : public IndependentDataStore {
     QORA_FileStream fStream;
     int64_t fDataStart = 0;
     int64_t fCaseCountRecordPos = 0;
+    SparseFileIndex fIndex;
+    int32_t fLiveIterators = 0;
+};
+
+// Reads the cases of a system file: positions by arithmetic when the data
+// are raw and through the sparse index when compressed, corrects the case
+// count at the end of the data, and joins very long strings again.
+class SystemFileDataSource::Iterator : public QORA_InputCaseIterator {
+  public:
+    // The source must outlive the iterator. buffer: optional caller units.
+    Iterator(SystemFileDataSource& source, void* buffer);
+    ~Iterator() override;
+
+    bool CanSeek() const override { return true; }
+    bool SeekCase(int64_t caseNumber) override;
+    int64_t TellCase() const override { return fRequested; }
+    bool ReadCase() override;
+
+  private:
+    // Reads the file's case: bytes delivered, 0 at the end of the data.
+    uint32_t ReadRaw(unsigned char* destination);
+    uint32_t ReadAhead(unsigned char* destination);
+    void Reposition();
+    int64_t FileEnd();
+    void NoteEnd();
+
+    SystemFileDataSource& fSource;
+    HeaderSettings& fSettings;
+    const SystemFileDechunker* fpDechunker;  // null: cases are read as they are
+    int64_t fRequested = 0;
+    int64_t fFileCase = -1;           // the case the stream stands before; -1 unknown
+    const uint32_t fCaseBytes;        // a case in the file
+    const unsigned char* fpSwapMask;  // null for a file in the machine's order
+    QORA_FileStream fStream;
+    std::unique_ptr<CompressedSystemFile> fpCompressed;
+    std::unique_ptr<unsigned char[]> fpRaw;  // the file's case, when strings are joined
+
+    // Raw data are read well ahead of the case, so that a case costs no call
+    // to the system: the bytes from fAheadBegin to fAheadEnd come next.
+    std::unique_ptr<unsigned char[]> fpAhead;
+    uint32_t fAheadSize = 0;
+    uint32_t fAheadBegin = 0;
+    uint32_t fAheadEnd = 0;
+    int64_t fFileEnd = 0;  // the size of the file when last looked at
 };
 
 // Opens a system file for reading. The name is in the interface encoding;

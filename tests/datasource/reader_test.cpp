@@ -49,7 +49,8 @@ TEST_P(Reader, EndRecordAloneGivesAnEmptyDictionary) {
     EXPECT_EQ(source->Settings().fCaseSize, 0);
     EXPECT_EQ(source->DataStart(), 176 + 8);
     EXPECT_EQ(source->IsSwapped(), Swapped());
-    EXPECT_EQ(source->NewIterator(nullptr), nullptr);
+    std::unique_ptr<QORA_InputCaseIterator> it(source->NewIterator(nullptr));
+    EXPECT_FALSE(it->ReadCase());
     EXPECT_EQ(source->FileSystemMissing(), kSysmis);
 }
 

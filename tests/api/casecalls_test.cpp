@@ -1,0 +1,261 @@
+// The case reading calls, end to end over fixture files.
+#include <gtest/gtest.h>
+
+#include <cmath>
+#include <cstdint>
+#include <cstring>
+#include <limits>
+#include <memory>
+#include <string>
+
+#include "SystemFileDataSource.h"
+#include "case_files.h"
+#include "handletable.h"
+#include "qoraio32.h"
+
+namespace {
+
+using namespace fixture;
+
+uint64_t Bits(double value) {
+    uint64_t bits;
+    std::memcpy(&bits, &value, sizeof bits);
+    return bits;
+}
+
+int OpenCases(const std::string& path) {
+    int handle = -1;
+    EXPECT_EQ(qoraOpenRead(path.c_str(), &handle), QORA_STATUS_OK);
+    return handle;
+}
+
+FileEntry& Entry(int handle) {
+    FileEntry* entry = nullptr;
+    TheHandleTable().Lookup(handle, AccessAny, &entry);
+    return *entry;
+}
+
+class CaseCallsTest : public ::testing::TestWithParam<DataForm> {
+  protected:
+    CaseCallsTest() : b(std::get<0>(GetParam())) { b.Compressed(std::get<1>(GetParam())); }
+    ~CaseCallsTest() override {
+        if (handle >= 0) qoraCloseRead(handle);
+    }
+
+    void Open(int cases) {
+        StandardCases(b, cases);
+        handle = OpenCases(b.WriteTemp());
+    }
+
+    // The values of the current case through the value calls.
+    void ExpectValues(int i) {
+        double x = -1, y = -1;
+        char s[13];
+        EXPECT_EQ(qoraGetValueNumeric(handle, 1.0, &x), QORA_STATUS_OK);
+        EXPECT_EQ(qoraGetValueChar(handle, 2.0, s, sizeof s), QORA_STATUS_OK);
+        EXPECT_EQ(qoraGetValueNumeric(handle, 3.0, &y), QORA_STATUS_OK);
+        EXPECT_EQ(x, ExpectedX(i));
+        EXPECT_EQ(std::string(s), ExpectedS(i));
+        EXPECT_EQ(Bits(y), Bits(ExpectedY(i)));
+    }
+
+    SysFileBuilder b;
+    int handle = -1;
+};
+
+INSTANTIATE_TEST_SUITE_P(Forms, CaseCallsTest, AllDataForms(), DataFormName);
+
+}  // namespace
+
+TEST_P(CaseCallsTest, ReadsEveryCaseThenWarnsUntilASeek) {
+    Open(5);
+    for (int i = 0; i < 5; ++i) {
+        ASSERT_EQ(qoraReadCaseRecord(handle), QORA_STATUS_OK);
+        ExpectValues(i);
+    }
+    EXPECT_EQ(qoraReadCaseRecord(handle), QORA_WARN_END_OF_FILE);
+    EXPECT_EQ(qoraReadCaseRecord(handle), QORA_WARN_END_OF_FILE);
+    double x;
+    EXPECT_EQ(qoraGetValueNumeric(handle, 1.0, &x), QORA_STATUS_NO_CURRENT_CASE);
+    EXPECT_EQ(qoraSeekNextCase(handle, 0), QORA_STATUS_OK);
+    ASSERT_EQ(qoraReadCaseRecord(handle), QORA_STATUS_OK);
+    ExpectValues(0);
+    EXPECT_EQ(qoraSeekNextCase(handle, 3), QORA_STATUS_OK);
+    EXPECT_EQ(qoraGetValueNumeric(handle, 1.0, &x), QORA_STATUS_NO_CURRENT_CASE);
+    ASSERT_EQ(qoraReadCaseRecord(handle), QORA_STATUS_OK);
+    ExpectValues(3);
+}
+
+// The whole case comes in the file's layout with numbers in the machine's
+// order, whatever the file's.
+TEST_P(CaseCallsTest, WholeCaseInCopiesTheCaseAndLeavesNoCurrentCase) {
+    Open(3);
+    double record[4];
+    double x = 5;
+    EXPECT_EQ(qoraGetValueNumeric(handle, 1.0, &x), QORA_STATUS_NO_CURRENT_CASE);
+    EXPECT_EQ(x, 0.0);
+    for (int i = 0; i < 3; ++i) {
+        ASSERT_EQ(qoraWholeCaseIn(handle, record), QORA_STATUS_OK);
+        EXPECT_EQ(record[0], ExpectedX(i));
+        EXPECT_EQ(std::string(reinterpret_cast<char*>(&record[1]), 16), ExpectedS(i) + "    ");
+        EXPECT_EQ(Bits(record[3]), Bits(ExpectedY(i)));
+        EXPECT_EQ(qoraGetValueNumeric(handle, 1.0, &x), QORA_STATUS_NO_CURRENT_CASE);
+    }
+    EXPECT_EQ(qoraWholeCaseIn(handle, record), QORA_WARN_END_OF_FILE);
+    EXPECT_EQ(qoraWholeCaseIn(handle, record), QORA_WARN_END_OF_FILE);
+    EXPECT_EQ(qoraSeekNextCase(handle, 2), QORA_STATUS_OK);
+    ASSERT_EQ(qoraWholeCaseIn(handle, record), QORA_STATUS_OK);
+    EXPECT_EQ(record[0], 2.0);
+    EXPECT_EQ(qoraWholeCaseIn(handle, nullptr), QORA_STATUS_READ_FAILED);
+}
+
+TEST_P(CaseCallsTest, VariableHandlesAreIndexPlusOneTruncated) {
+    Open(2);
+    ASSERT_EQ(qoraReadCaseRecord(handle), QORA_STATUS_OK);
+    ASSERT_EQ(qoraReadCaseRecord(handle), QORA_STATUS_OK);
+    double value;
+    char text[20];
+    for (double bad : {0.0, 0.99, -1.0, 4.0, 1e300, std::numeric_limits<double>::quiet_NaN()}) {
+        EXPECT_EQ(qoraGetValueNumeric(handle, bad, &value), QORA_STATUS_BAD_VAR_HANDLE) << bad;
+        EXPECT_EQ(qoraGetValueChar(handle, bad, text, 20), QORA_STATUS_BAD_VAR_HANDLE) << bad;
+    }
+    EXPECT_EQ(qoraGetValueNumeric(handle, 3.9, &value), QORA_STATUS_OK);
+    EXPECT_EQ(value, ExpectedY(1));
+    EXPECT_EQ(qoraGetValueChar(handle, 2.9, text, 20), QORA_STATUS_OK);
+    EXPECT_EQ(std::string(text), ExpectedS(1));
+}
+
+TEST_P(CaseCallsTest, ValueCallsCheckTypeAndBuffer) {
+    Open(1);
+    ASSERT_EQ(qoraReadCaseRecord(handle), QORA_STATUS_OK);
+    double value = 9;
+    char text[13] = "xxxxxxxxxxxx";
+    EXPECT_EQ(qoraGetValueNumeric(handle, 2.0, &value), QORA_STATUS_NUMERIC_REQUIRED);
+    EXPECT_EQ(value, 0.0);
+    EXPECT_EQ(qoraGetValueChar(handle, 1.0, text, 13), QORA_STATUS_STRING_REQUIRED);
+    EXPECT_EQ(text[0], '\0');
+    EXPECT_EQ(qoraGetValueChar(handle, 2.0, text, 12), QORA_STATUS_BUFFER_TOO_SHORT);
+    EXPECT_EQ(qoraGetValueChar(handle, 2.0, text, 0), QORA_STATUS_BUFFER_TOO_SHORT);
+    EXPECT_EQ(qoraGetValueChar(handle, 2.0, text, 13), QORA_STATUS_OK);
+    EXPECT_EQ(std::string(text, 13), ExpectedS(0) + '\0');
+    EXPECT_EQ(qoraGetValueNumeric(handle, 1.0, nullptr), QORA_STATUS_READ_FAILED);
+    EXPECT_EQ(qoraGetValueChar(handle, 2.0, nullptr, 13), QORA_STATUS_READ_FAILED);
+}
+
+TEST_P(CaseCallsTest, SeeksOutsideTheFileAreRefusedOrFindTheEnd) {
+    b.header().caseCount = -1;
+    Open(4);
+    ASSERT_EQ(qoraReadCaseRecord(handle), QORA_STATUS_OK);
+    EXPECT_EQ(qoraSeekNextCase(handle, -1), QORA_STATUS_READ_FAILED);
+    double x;
+    EXPECT_EQ(qoraGetValueNumeric(handle, 1.0, &x), QORA_STATUS_NO_CURRENT_CASE);
+    int count = 0;
+    EXPECT_EQ(qoraGetNumberofCases(handle, &count), QORA_STATUS_OK);
+    EXPECT_EQ(count, -1);
+    EXPECT_EQ(qoraSeekNextCase(handle, 2147483647), QORA_STATUS_OK);
+    EXPECT_EQ(qoraReadCaseRecord(handle), QORA_WARN_END_OF_FILE);
+    EXPECT_EQ(qoraGetNumberofCases(handle, &count), QORA_STATUS_OK);
+    EXPECT_EQ(count, 4);
+    EXPECT_EQ(qoraSeekNextCase(handle, 1), QORA_STATUS_OK);
+    ASSERT_EQ(qoraReadCaseRecord(handle), QORA_STATUS_OK);
+    ExpectValues(1);
+}
+
+// A case cut short is an error each time it is asked for, and leaves no
+// half-read values behind.
+// A count that lies either way is the true one once the end was met.
+TEST_P(CaseCallsTest, TheCountOfTheHeaderGivesWayToTheCasesRead) {
+    for (int32_t claimed : {9, 2}) {
+        SCOPED_TRACE(claimed);
+        if (handle >= 0) qoraCloseRead(handle);
+        b = SysFileBuilder(std::get<0>(GetParam()));
+        b.Compressed(std::get<1>(GetParam()));
+        b.header().caseCount = claimed;
+        Open(4);
+        int count = 0, size = 0;
+        EXPECT_EQ(qoraGetCaseSize(handle, &size), QORA_STATUS_OK);
+        EXPECT_EQ(size, 32);
+        double record[4];
+        for (int i = 0; i < 4; ++i) ASSERT_EQ(qoraWholeCaseIn(handle, record), QORA_STATUS_OK);
+        EXPECT_EQ(qoraWholeCaseIn(handle, record), QORA_WARN_END_OF_FILE);
+        EXPECT_EQ(qoraGetNumberofCases(handle, &count), QORA_STATUS_OK);
+        EXPECT_EQ(count, 4);
+    }
+}
+
+TEST_P(CaseCallsTest, DataEndingInsideACaseFailsTheRead) {
+    StandardCases(b, 3);
+    const Bytes bytes = b.Build();
+    handle = OpenCases(b.WriteTemp(Truncated(bytes, bytes.size() - 8), "cut.qsf"));
+    ASSERT_EQ(qoraReadCaseRecord(handle), QORA_STATUS_OK);
+    ASSERT_EQ(qoraReadCaseRecord(handle), QORA_STATUS_OK);
+    EXPECT_EQ(qoraReadCaseRecord(handle), QORA_STATUS_READ_FAILED);
+    double x;
+    EXPECT_EQ(qoraGetValueNumeric(handle, 1.0, &x), QORA_STATUS_NO_CURRENT_CASE);
+    double record[4];
+    EXPECT_EQ(qoraWholeCaseIn(handle, record), QORA_STATUS_READ_FAILED);
+    EXPECT_EQ(qoraSeekNextCase(handle, 1), QORA_STATUS_OK);
+    ASSERT_EQ(qoraReadCaseRecord(handle), QORA_STATUS_OK);
+    ExpectValues(1);
+}
+
+TEST_P(CaseCallsTest, AFirstCaseCutShortFailsEveryRead) {
+    // Only part of the first case is there.
+    StandardCases(b, 1);
+    const Bytes bytes = b.Build();
+    handle = OpenCases(b.WriteTemp(Truncated(bytes, b.DataStart() + 3), "cut.qsf"));
+    EXPECT_EQ(qoraReadCaseRecord(handle), QORA_STATUS_READ_FAILED);
+    EXPECT_EQ(qoraReadCaseRecord(handle), QORA_STATUS_READ_FAILED);
+}
+
+TEST(CaseCalls, HandlesModesAndAMissingReaderGiveTheirStatus) {
+    double value;
+    char text[4];
+    double record[1];
+    EXPECT_EQ(qoraReadCaseRecord(-1), QORA_STATUS_BAD_FILE_HANDLE);
+    EXPECT_EQ(qoraWholeCaseIn(100, record), QORA_STATUS_BAD_FILE_HANDLE);
+    EXPECT_EQ(qoraSeekNextCase(99, 0), QORA_STATUS_BAD_FILE_HANDLE);
+    EXPECT_EQ(qoraGetValueNumeric(7, 1.0, &value), QORA_STATUS_BAD_FILE_HANDLE);
+    EXPECT_EQ(qoraGetValueChar(7, 1.0, text, 4), QORA_STATUS_BAD_FILE_HANDLE);
+
+    int writing = -1;
+    ASSERT_EQ(TheHandleTable().Insert(
+                  std::make_unique<FileEntry>(std::make_unique<SystemFileDataSource>(), WriteMode),
+                  &writing),
+              QORA_STATUS_OK);
+    EXPECT_EQ(qoraReadCaseRecord(writing), QORA_STATUS_NOT_OPENED_FOR_READING);
+    EXPECT_EQ(qoraWholeCaseIn(writing, record), QORA_STATUS_NOT_OPENED_FOR_READING);
+    EXPECT_EQ(qoraSeekNextCase(writing, 0), QORA_STATUS_NOT_OPENED_FOR_READING);
+    EXPECT_EQ(qoraGetValueNumeric(writing, 1.0, &value), QORA_STATUS_NOT_OPENED_FOR_READING);
+    TheHandleTable().Close(writing);
+
+    // An entry whose reader could not be made.
+    SysFileBuilder b;
+    StandardCases(b, 1);
+    int reading = -1;
+    auto entry =
+        std::make_unique<FileEntry>(OpenForReading(b.WriteTemp().c_str(), nullptr), ReadMode);
+    ASSERT_EQ(TheHandleTable().Insert(std::move(entry), &reading), QORA_STATUS_OK);
+    EXPECT_EQ(qoraReadCaseRecord(reading), QORA_STATUS_NO_MEMORY);
+    EXPECT_EQ(qoraWholeCaseIn(reading, record), QORA_STATUS_NO_MEMORY);
+    EXPECT_EQ(qoraSeekNextCase(reading, 0), QORA_STATUS_NO_MEMORY);
+    EXPECT_EQ(qoraGetValueNumeric(reading, 1.0, &value), QORA_STATUS_NO_CURRENT_CASE);
+    Entry(reading).fCaseState = CaseLoaded;
+    Entry(reading).fValueSlots.clear();  // values before the slot table exists
+    EXPECT_EQ(qoraGetValueNumeric(reading, 1.0, &value), QORA_STATUS_DICT_NOT_COMMITTED);
+    TheHandleTable().Close(reading);
+}
+
+TEST(CaseCalls, SpecialValuesAreBitExact) {
+    EXPECT_EQ(Bits(qoraSysmisVal()), 0xFFEFFFFFFFFFFFFFull);
+    double sysmis = 0, lowest = 0, highest = 0;
+    EXPECT_EQ(qoraHostSysmisVal(&sysmis), QORA_STATUS_OK);
+    EXPECT_EQ(Bits(sysmis), 0xFFEFFFFFFFFFFFFFull);
+    EXPECT_EQ(qoraLowHighVal(&lowest, &highest), QORA_STATUS_OK);
+    EXPECT_EQ(Bits(lowest), 0xFFEFFFFFFFFFFFFEull);
+    EXPECT_EQ(Bits(highest), 0x7FEFFFFFFFFFFFFFull);
+    EXPECT_EQ(lowest, -1.7976931348623155e308);
+    EXPECT_EQ(highest, 1.7976931348623157e308);
+    EXPECT_EQ(qoraHostSysmisVal(nullptr), QORA_STATUS_OK);
+    EXPECT_EQ(qoraLowHighVal(nullptr, nullptr), QORA_STATUS_OK);
+}

@@ -1,0 +1,96 @@
+// The dump tool on the example file: its CSV, its dictionary text, its
+// ranges and its error reports, as a user sees them.
+#include <gtest/gtest.h>
+#include <sys/wait.h>
+
+#include <algorithm>
+#include <cctype>
+#include <cstdio>
+#include <fstream>
+#include <string>
+
+#include "sysfile_builder.h"
+
+namespace {
+
+struct DumpResult {
+    int exitCode;
+    std::string output;  // stdout and stderr
+};
+
+DumpResult Dump(const std::string& arguments) {
+    const std::string command = std::string(QORADUMP_PATH) + " " + arguments + " 2>&1";
+    DumpResult run{-1, {}};
+    std::FILE* pipe = popen(command.c_str(), "r");
+    if (!pipe) return run;
+    char buffer[4096];
+    for (size_t n; (n = std::fread(buffer, 1, sizeof buffer, pipe)) > 0;)
+        run.output.append(buffer, n);
+    const int status = pclose(pipe);
+    run.exitCode = WIFEXITED(status) ? WEXITSTATUS(status) : -1;
+    return run;
+}
+
+const std::string kSample = QORA_EXAMPLES_DIR "/sample.qsf";
+
+// The names as the file's long names give them, or lower-cased where the
+// long names are not applied; either is right for these tests.
+std::string Folded(std::string text) {
+    for (char& c : text) c = char(std::tolower(static_cast<unsigned char>(c)));
+    return text;
+}
+
+TEST(QoraDump, CasesAreCsvWithQuotingTrimmingAndEmptyMissing) {
+    const DumpResult run = Dump("--cases " + kSample);
+    ASSERT_EQ(run.exitCode, 0) << run.output;
+    EXPECT_EQ(Folded(run.output.substr(0, run.output.find('\n'))), "id,sex,score,city,remark,born");
+    EXPECT_NE(run.output.find("\n1,1,87.5,LDN,friendly,12219379200\n"), std::string::npos);
+    EXPECT_NE(run.output.find("\n2,2,92,PAR,\"said \"\"no comment\"\"\","), std::string::npos);
+    EXPECT_NE(run.output.find("\n3,9,-5,NONE,,\n"), std::string::npos);
+    EXPECT_NE(run.output.find("\n4,1,,LDN,\"late, then left early\","), std::string::npos);
+    EXPECT_NE(run.output.find("\n5,2,64.25,ROM,  leading blanks kept,"), std::string::npos);
+    EXPECT_EQ(std::count(run.output.begin(), run.output.end(), '\n'), 13);
+}
+
+TEST(QoraDump, RangeSeeksToTheFirstCaseAndStopsAfterTheLast) {
+    const DumpResult run = Dump("--cases --from 11 --to 12 " + kSample);
+    ASSERT_EQ(run.exitCode, 0) << run.output;
+    EXPECT_EQ(Folded(run.output),
+              "id,sex,score,city,remark,born\n"
+              "11,1,-1,none,refused the test,12166675200\n"
+              "12,2,79,par,the last one,13481769600\n");
+
+    const DumpResult past = Dump("--cases --from 20 " + kSample);
+    EXPECT_EQ(past.exitCode, 0) << past.output;
+    EXPECT_EQ(std::count(past.output.begin(), past.output.end(), '\n'), 1);
+}
+
+TEST(QoraDump, DictionaryShowsEveryProperty) {
+    const DumpResult run = Dump("--dict " + kSample);
+    ASSERT_EQ(run.exitCode, 0) << run.output;
+    const std::string output = Folded(run.output);
+    for (const char* line :
+         {"Variables: 6\n", "Cases: 12\n", "Case size: 72 bytes\n", "2. sex (numeric)\n",
+          "    label: Sex of respondent\n", "    missing values: 9\n",
+          "    value label: 2 = \"Female\"\n", "    missing values: -99 thru -1\n",
+          "4. city (string, 6 bytes)\n", "    missing values: \"NONE\"\n",
+          "    value label: \"LDN\" = \"London\"\n",
+          "    print format: code 20, width 11, 0 decimals\n", "    measurement level "})
+        EXPECT_NE(output.find(Folded(line)), std::string::npos) << line;
+    EXPECT_EQ(output.find("id,sex"), std::string::npos);
+}
+
+TEST(QoraDump, ErrorsNameTheStatusAndExitNonZero) {
+    fixture::TempDir dir;
+    const std::string bad = dir.Path() + "/bad.qsf";
+    std::ofstream(bad) << "not a system file";
+    const DumpResult run = Dump(bad);
+    EXPECT_EQ(run.exitCode, 1);
+    EXPECT_NE(run.output.find("QORA_STATUS_BAD_FILE (6)"), std::string::npos) << run.output;
+
+    EXPECT_EQ(Dump("--from 0 " + kSample).exitCode, 2);
+    EXPECT_EQ(Dump("--dict --cases " + kSample).exitCode, 2);
+    EXPECT_EQ(Dump("").exitCode, 2);
+}
+
+}  // namespace
