@@ -54,6 +54,10 @@ TEST_F(CaseTest, StringFillsEveryUnitOfItsVariable) {
     EXPECT_EQ(Bytes(c, 1, 16), "XY" + std::string(14, ' '));
     c.SetString(1, nullptr);
     EXPECT_EQ(Bytes(c, 1, 16), std::string(16, ' '));
+    EXPECT_THROW(c.SetString(0, "x"), ErrorText);
+    EXPECT_THROW(c.SetNumeric(4, 1.0), ErrorText);
+    EXPECT_THROW(c.SetNumeric(-1, 1.0), ErrorText);
+    EXPECT_THROW(c.ValuePointer(-1), ErrorText);
 }
 
 TEST_F(CaseTest, StringIsCutAtAWholeCharacter) {
@@ -67,14 +71,6 @@ TEST_F(CaseTest, StringIsCutAtAWholeCharacter) {
     EXPECT_EQ(Bytes(c, 1, 16), "1234567\xE2\x82\xAC" + std::string(6, ' '));
     c.SetString(2, "ab\xC3\xA9");
     EXPECT_EQ(Bytes(c, 2, 8), "ab" + std::string(6, ' '));
-}
-
-TEST_F(CaseTest, PreconditionsAreChecked) {
-    QORA_Case c(source);
-    EXPECT_THROW(c.SetString(0, "x"), ErrorText);
-    EXPECT_THROW(c.SetNumeric(4, 1.0), ErrorText);
-    EXPECT_THROW(c.SetNumeric(-1, 1.0), ErrorText);
-    EXPECT_THROW(c.ValuePointer(-1), ErrorText);
 }
 
 TEST_F(CaseTest, ClearsARangeOrEverything) {
@@ -94,8 +90,6 @@ TEST_F(CaseTest, OwnsOnlyTheBufferItMade) {
         QORA_Case c(source);
         EXPECT_TRUE(c.OwnsBuffer());
         EXPECT_EQ(Bytes(c, 0, 40), std::string(40, '\0'));
-        EXPECT_EQ(c.GetLink(), nullptr);
-        EXPECT_EQ(c.GetSetting(), 0);
     }
     auto buffer = std::make_unique<double[]>(5);
     {
@@ -111,8 +105,6 @@ TEST_F(CaseTest, CaseValueSetsThroughTheIterator) {
     std::unique_ptr<QORA_InputCaseIterator> it(source.NewIterator(nullptr));
     CaseValue number(*it, 0);
     CaseValue text(*it, 1);
-    EXPECT_EQ(text.Type(), 10);
-    EXPECT_EQ(text.Index(), 1);
 
     const double v = 3.25;
     number.SetRaw(&v);

@@ -49,7 +49,6 @@ SystemFileExtensionRecord RecordOf(const std::string& bytes, int32_t unitSize) {
 
 TEST(ExtensionRecord, ContentsNeedBothSizesAndFixThem) {
     SystemFileExtensionRecord record;
-    EXPECT_TRUE(record.IsEmpty());
     EXPECT_THROW(record.Contents(), ErrorText);
     record.SetUnitSize(4);
     record.SetNUnits(2);
@@ -64,11 +63,7 @@ TEST(ExtensionRegistry, FindsOnlyRegisteredSubtypes) {
     RecordingHandler& handler = Handler();
     EXPECT_EQ(FindExtensionHandler(kHandled), &handler);
     EXPECT_EQ(FindExtensionHandler(kUnhandled), nullptr);
-    EXPECT_EQ(FindExtensionHandler(-1), nullptr);
-    EXPECT_EQ(FindExtensionHandler(1 << 20), nullptr);
-    // No subtype of the file format has a handler yet: all are kept verbatim.
-    for (int32_t subtype : {3, 4, 6, 11, 13, 14, 16, 17, 18, 20, 21})
-        EXPECT_EQ(FindExtensionHandler(subtype), nullptr) << subtype;
+    for (int32_t subtype : {-1, 1 << 20}) EXPECT_EQ(FindExtensionHandler(subtype), nullptr);
 }
 
 TEST(ExtensionRegistry, ImportGoesToTheHandlerOrIntoStorage) {

@@ -163,12 +163,10 @@ TEST_P(MalformedReader, EveryTruncationFailsCleanly) {
     const size_t dataStart = b.DataStart();
     for (size_t size = 0; size < whole.size(); ++size) {
         const OpenFailure f = FailureOf(b.WriteTemp(Truncated(whole, size), "cut.qsf"));
-        if (size < dataStart) {
-            EXPECT_TRUE(f.number == kErrTooShort || f.number == kErrBadFormat)
-                << size << ": " << f.text;
-        } else {
+        if (size < dataStart)
+            EXPECT_TRUE(f.number == kErrTooShort || f.number == kErrBadFormat) << size << f.text;
+        else
             EXPECT_EQ(f.number, 0) << size << ": " << f.text;
-        }
     }
 }
 
@@ -177,12 +175,10 @@ TEST_P(MalformedReader, CorruptedBytesNeverEscapeTheChecks) {
     const SysFileBuilder b = Full();
     const Bytes whole = b.Build();
     for (size_t at = 0; at < b.DataStart(); ++at) {
-        for (uint8_t value : {uint8_t(0x80), uint8_t(0xFF)}) {
-            Bytes bytes = whole;
-            bytes[at] = value;
-            const OpenFailure f = FailureOf(b.WriteTemp(bytes, "bad.qsf"));
-            EXPECT_TRUE(f.number == 0 || f.number == kErrTooShort || f.number == kErrBadFormat)
-                << at << ": " << f.text;
-        }
+        Bytes bytes = whole;
+        bytes[at] = at % 2 ? 0x80 : 0xFF;  // a sign bit or a huge count
+        const OpenFailure f = FailureOf(b.WriteTemp(bytes, "bad.qsf"));
+        EXPECT_TRUE(f.number == 0 || f.number == kErrTooShort || f.number == kErrBadFormat)
+            << at << ": " << f.text;
     }
 }

@@ -3,6 +3,8 @@
 #include <gtest/gtest.h>
 
 #include <cstring>
+#include <iomanip>
+#include <sstream>
 #include <string>
 #include <vector>
 
@@ -17,16 +19,25 @@ class Reader : public ByteOrders {};
 INSTANTIATE_TEST_SUITE_P(Orders, Reader, ::testing::Values(Endian::Native, Endian::Swapped),
                          EndianName);
 
-std::vector<double> MissingNumbers(const QORA_Variable& var) {
-    double v[3] = {};
-    const int code = var.GetMissingValues(&v[0], &v[1], &v[2]);
-    return std::vector<double>(v, v + std::abs(code));
-}
-
-std::string Slot(const QORA_Variable& var, int k) {
-    char v[3][8];
-    var.GetMissingValues(v[0], v[1], v[2]);
-    return std::string(v[k], 8);
+// A variable on one line: name|type|label|missing code|missing values|print|write.
+std::string Describe(const QORA_Variable& var) {
+    std::ostringstream out;
+    out << std::setprecision(17) << var.GetName() << "|" << var.GetType() << "|"
+        << (var.GetLabel() ? var.GetLabel() : "(none)") << "|" << var.GetMissingCode() << "|";
+    double numbers[3];
+    char texts[3][8];
+    const int code = var.GetType() == 0
+                         ? var.GetMissingValues(&numbers[0], &numbers[1], &numbers[2])
+                         : var.GetMissingValues(texts[0], texts[1], texts[2]);
+    for (int k = 0; k < std::abs(code); ++k) {
+        if (var.GetType() == 0)
+            out << numbers[k] << " ";
+        else
+            out << std::string(texts[k], 8) << ",";
+    }
+    for (const QORA_Format& f : {var.GetPrintFormat(), var.GetWriteFormat()})
+        out << "|" << f.code << "." << f.width << "." << f.decimals;
+    return out.str();
 }
 
 }  // namespace
@@ -35,10 +46,7 @@ TEST_P(Reader, EndRecordAloneGivesAnEmptyDictionary) {
     SysFileBuilder b(GetParam());
     auto source = OpenFixture(b.WriteTemp());
     EXPECT_EQ(source->ColumnCount(), 0);
-    EXPECT_EQ(source->ValueCount(), 0);
     EXPECT_EQ(source->Settings().fCaseSize, 0);
-    EXPECT_EQ(source->GetCaseWeight(), -1);
-    EXPECT_EQ(source->GetState(), SystemFileDataSource::kReading);
     EXPECT_EQ(source->DataStart(), 176 + 8);
     EXPECT_EQ(source->IsSwapped(), Swapped());
     std::unique_ptr<QORA_InputCaseIterator> it(source->NewIterator(nullptr));
@@ -64,12 +72,13 @@ TEST_P(Reader, HeaderFieldsReachTheSettingsAndTheSource) {
     EXPECT_STREQ(source->GetIdString(), "Survey 2026");
     EXPECT_EQ(source->GetTimeStamp(), 14015783803.0);  // 04 Dec 26 17:16:43
     EXPECT_EQ(source->GetFileName(), path);
-    EXPECT_EQ(source->CaseCountRecordPosition(), 0);
+    EXPECT_EQ(source->CaseCountRecordPosition(), 0);  // no such record
 
     b.header().caseCount = -1;
     b.header().date = " 4 Dec 26";  // unreadable: the stamp stays as made
-    EXPECT_EQ(OpenFixture(b.WriteTemp())->CaseCount(), -1);
-    EXPECT_NE(OpenFixture(b.WriteTemp())->GetTimeStamp(), 14015783803.0);
+    source = OpenFixture(b.WriteTemp());
+    EXPECT_EQ(source->CaseCount(), -1);
+    EXPECT_NE(source->GetTimeStamp(), 14015783803.0);
 }
 
 // Codes as the reader sees them: 2, 0 and 256 read from a file written the
@@ -105,27 +114,14 @@ TEST_P(Reader, VariablesKeepTheirPropertiesAndUnits) {
     EXPECT_EQ(source->ValueCount(), 1 + 3 + 1 + 1 + 1);
     EXPECT_EQ(source->ValueOffset(2), 4);
 
-    const QORA_Variable& age = source->GetVariable(0);
-    EXPECT_EQ(age.GetName(), "age");
-    EXPECT_EQ(age.GetType(), 0);
-    EXPECT_STREQ(age.GetLabel(), "Age");
-    EXPECT_EQ(age.GetMissingCode(), 2);
-    EXPECT_EQ(MissingNumbers(age), (std::vector<double>{-1.0, 99.0}));
-
-    const QORA_Variable& name = source->GetVariable(1);
-    EXPECT_EQ(name.GetType(), 20);
-    EXPECT_STREQ(name.GetLabel(), "Name in full");
-    EXPECT_EQ(name.GetPrintFormat(), (QORA_Format{1, 20, 0}));
-    EXPECT_EQ(Slot(name, 0), "none    ");
-    EXPECT_EQ(Slot(name, 1), "N/A     ");
-
-    const QORA_Variable& income = source->GetVariable(2);
-    EXPECT_EQ(income.GetMissingCode(), -3);
-    EXPECT_EQ(MissingNumbers(income), (std::vector<double>{1.0, 5.0, 9.0}));
-    EXPECT_EQ(income.GetPrintFormat(), (QORA_Format{5, 12, 3}));
-    EXPECT_EQ(income.GetWriteFormat(), (QORA_Format{3, 10, 1}));
-    EXPECT_STREQ(source->GetVariable(3).GetLabel(), "12345678");
-    EXPECT_EQ(MissingNumbers(source->GetVariable(4)), (std::vector<double>{kSysmis, 10.0}));
+    const char* expected[] = {
+        "age|0|Age|2|-1 99 |5.8.2|5.8.2",
+        "name|20|Name in full|2|none    ,N/A     ,|1.20.0|1.20.0",
+        "income|0|(none)|-3|1 5 9 |5.12.3|3.10.1",
+        "code|8|12345678|0||1.8.0|1.8.0",
+        "score|0|(none)|-2|-1.7976931348623157e+308 10 |5.8.2|5.8.2",
+    };
+    for (int i = 0; i < 5; ++i) EXPECT_EQ(Describe(source->GetVariable(i)), expected[i]);
 }
 
 TEST_P(Reader, ValueLabelSetsAreSharedAndTyped) {
@@ -186,12 +182,9 @@ TEST_P(Reader, DocumentsAndUnknownExtensionsAreStoredWhole) {
     EXPECT_EQ(twelve->Content(), std::string("\1\2\3\4\5\6\7\10", 8));
     EXPECT_TRUE(source->HasExtension(150));
 
-    EXPECT_TRUE(source->HasExtensionRecord(0));
-    EXPECT_TRUE(source->HasExtensionRecord(12));
-    EXPECT_TRUE(source->HasExtensionRecord(99));
-    EXPECT_FALSE(source->HasExtensionRecord(150));
-    EXPECT_FALSE(source->HasExtensionRecord(13));
-    EXPECT_FALSE(source->HasExtensionRecord(-1));
+    // Seen records are noted only for subtypes below a hundred.
+    for (int32_t type : {-1, 0, 12, 13, 99, 150})
+        EXPECT_EQ(source->HasExtensionRecord(type), type == 0 || type == 12 || type == 99) << type;
     int major = 0, minor = 0, revision = 0;
     EXPECT_FALSE(source->GetReleaseInfo(&major, &minor, &revision));
 }
@@ -254,13 +247,9 @@ TEST_P(Reader, RepeatedAndInvalidNamesAreRenamed) {
     std::vector<std::string> names;
     for (int i = 0; i < source->ColumnCount(); ++i)
         names.push_back(source->GetVariable(i).GetName());
-    EXPECT_EQ(names[0], "age");
-    EXPECT_EQ(names[1], "v2");  // V1 is taken
-    EXPECT_EQ(names[2], "v1");
-    EXPECT_EQ(names[3], "v3");
-    EXPECT_EQ(names[4], "v4");
-    EXPECT_EQ(names[5], "v5");
-    EXPECT_EQ(names.size(), 7u);
+    ASSERT_EQ(names.size(), 7u);
+    names.pop_back();  // the multibyte name is not checked here
+    EXPECT_EQ(names, (std::vector<std::string>{"age", "v2", "v1", "v3", "v4", "v5"}));  // V1 taken
 }
 
 // A large dictionary of every kind of variable reads back exactly.
@@ -286,25 +275,19 @@ TEST_P(Reader, ThousandVariablesReadBackExactly) {
     ASSERT_EQ(source->ColumnCount(), 1000);
     EXPECT_EQ(source->ValueCount(), b.CaseUnits());
     for (int i = 0; i < 1000; ++i) {
+        const std::string n = std::to_string(i);
         const QORA_Variable& var = source->GetVariable(i);
-        ASSERT_EQ(var.GetName(), "v" + std::to_string(i));
-        EXPECT_EQ(source->ValueOffset(i) + 1, b.Slot("V" + std::to_string(i)));
-        switch (i % 4) {
-            case 0:
-                EXPECT_STREQ(var.GetLabel(), ("Number " + std::to_string(i)).c_str());
-                EXPECT_EQ(MissingNumbers(var), std::vector<double>{double(i)});
-                EXPECT_EQ(*var.GetValueLabels().Lookup(double(i)), "L" + std::to_string(i));
-                break;
-            case 1:
-                EXPECT_EQ(var.GetType(), 1 + i % 255);
-                EXPECT_EQ(var.GetLabel(), std::string(i % 200, 'x'));
-                break;
-            case 2:
-                EXPECT_EQ(var.GetMissingCode(), -2);
-                EXPECT_EQ(MissingNumbers(var), (std::vector<double>{-double(i), double(i)}));
-                break;
-            default:
-                EXPECT_EQ(Slot(var, 0), ("m" + std::to_string(i % 100) + "      ").substr(0, 8));
+        EXPECT_EQ(source->ValueOffset(i) + 1, b.Slot("V" + n));
+        const std::string x = std::string(i % 200, 'x'), width = std::to_string(1 + i % 255);
+        const std::string expected[] = {
+            "v" + n + "|0|Number " + n + "|1|" + n + " |5.8.2|5.8.2",
+            "v" + n + "|" + width + "|" + x + "|0||1." + width + ".0|1." + width + ".0",
+            "v" + n + "|0|(none)|-2|-" + n + " " + n + " |5.8.2|5.8.2",
+            "v" + n + "|8|(none)|1|" + ("m" + std::to_string(i % 100) + "      ").substr(0, 8) +
+                ",|1.8.0|1.8.0"};
+        ASSERT_EQ(Describe(var), expected[i % 4]);
+        if (i % 4 == 0) {
+            EXPECT_EQ(*var.GetValueLabels().Lookup(double(i)), "L" + n);
         }
     }
 }

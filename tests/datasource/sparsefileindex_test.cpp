@@ -18,48 +18,31 @@ void OfferCases(SparseFileIndex& index, int64_t count, int64_t caseBytes) {
 
 }  // namespace
 
-TEST(SparseFileIndex, StartsEmptyAndAnswersTheStartOfTheData) {
-    SparseFileIndex index;
-    EXPECT_EQ(index.Spacing(), 4096u);
-    EXPECT_EQ(index.LastPosition(), -1);
-    ExpectEntry(index.Lookup(0), 0, 0);
-    ExpectEntry(index.Lookup(1000), 0, 0);
-    EXPECT_EQ(SparseFileIndex(256).Spacing(), 16u);
-    EXPECT_EQ(SparseFileIndex(100).Spacing(), 40u);
-    EXPECT_THROW(SparseFileIndex(0), ErrorText);
-}
-
 TEST(SparseFileIndex, OfferKeepsOneEntryPerSpacing) {
+    EXPECT_EQ(SparseFileIndex(100).Spacing(), 40u);  // the default 4096 shared out
+    EXPECT_THROW(SparseFileIndex(0), ErrorText);
     SparseFileIndex index;
-    OfferCases(index, 100, 100);  // 9900 bytes
+    ExpectEntry(index.Lookup(1000), 0, 0);  // empty: the start of the data
+    OfferCases(index, 100, 100);            // 9900 bytes
     ASSERT_EQ(index.Count(), 3u);
-    ExpectEntry(index.At(0), 0, 0);
     ExpectEntry(index.At(1), 41, 4100);
     ExpectEntry(index.At(2), 82, 8200);
-    EXPECT_EQ(index.LastPosition(), 9900);
-
     index.Offer(50, 5000);  // not beyond the last position: ignored
     EXPECT_EQ(index.Count(), 3u);
     EXPECT_EQ(index.LastPosition(), 9900);
-}
 
-TEST(SparseFileIndex, ALongCaseWidensTheSpacing) {
-    SparseFileIndex index;
-    index.Offer(0, 0);
-    index.Offer(1, 10000);
-    EXPECT_EQ(index.Spacing(), 10000u);
-    ASSERT_EQ(index.Count(), 2u);
-    index.Offer(2, 15000);  // closer than the new spacing
-    EXPECT_EQ(index.Count(), 2u);
-    EXPECT_EQ(index.LastPosition(), 15000);
+    SparseFileIndex wide;  // a long case widens the spacing
+    wide.Offer(0, 0);
+    wide.Offer(1, 10000);
+    EXPECT_EQ(wide.Spacing(), 10000u);
+    wide.Offer(2, 15000);  // closer than the new spacing
+    EXPECT_EQ(wide.Count(), 2u);
 }
 
 TEST(SparseFileIndex, ThinsToHalfAndDoublesTheSpacing) {
     SparseFileIndex index;
     // Entries every 4096 bytes; the 256th entry reaches spacing / 16.
-    OfferCases(index, 255, 4096);
-    EXPECT_EQ(index.Count(), 255u);
-    index.Offer(255, 255 * 4096);
+    OfferCases(index, 256, 4096);
     EXPECT_EQ(index.Count(), 128u);
     EXPECT_EQ(index.Spacing(), 8192u);
     for (size_t i = 0; i < index.Count(); ++i) ExpectEntry(index.At(i), 2 * i, 2 * i * 4096);
@@ -89,10 +72,8 @@ TEST(SparseFileIndex, LookupBelowTheFirstEntryIsTheStart) {
     SparseFileIndex index;
     index.Offer(10, 500);  // the first case offered is not case 0
     index.Offer(20, 9000);
-    ExpectEntry(index.Lookup(5), 0, 0);
-    ExpectEntry(index.Lookup(15), 10, 500);
-    ExpectEntry(index.Lookup(25), 20, 9000);
-    // The remembered entry answers again, and a later miss searches anew.
-    ExpectEntry(index.Lookup(19), 10, 500);
-    ExpectEntry(index.Lookup(20), 20, 9000);
+    // In this order the remembered entry answers again, and a miss searches anew.
+    const int64_t rows[][3] = {
+        {5, 0, 0}, {15, 10, 500}, {25, 20, 9000}, {19, 10, 500}, {20, 20, 9000}};
+    for (const auto& r : rows) ExpectEntry(index.Lookup(r[0]), r[1], r[2]);
 }

@@ -9,14 +9,11 @@
 
 namespace {
 
+using Set = QORA_VariableSet;
+
 class DictionaryOnly : public QORA_DataSource {
   public:
     QORA_InputCaseIterator* NewIterator(void*) override { return nullptr; }
-    void AddNumeric(const char* name) {
-        QORA_Variable var(0);
-        var.SetName(name);
-        AppendVariable(var);
-    }
     std::string Record(int32_t type) const {
         return HasExtension(type) ? GetExtension(type).Impl()->Content() : std::string();
     }
@@ -25,110 +22,72 @@ class DictionaryOnly : public QORA_DataSource {
     }
 };
 
-QORA_VariableSet Dichotomy(const char* name, const char* value, const char* label) {
-    QORA_VariableSet set(QORA_VariableSet::kMultipleDichotomy);
+Set Make(Set::Category category, const char* name, const char* value, const char* label,
+         std::initializer_list<const char*> variables, uint32_t flags = 0) {
+    Set set(category);
     set.SetName(name);
     set.SetValue(value);
     set.SetLabel(label);
+    for (const char* v : variables) set.AddVariable(v);
+    set.SetExtended(flags & Set::kExtendedFlag);
+    set.SetLabelLeftOut(flags & Set::kLabelLeftOut);
     return set;
 }
 
-std::string LineOf(const QORA_VariableSet& set) {
+// Every field of a set on one line: category|name|value|label|flags|variables.
+std::string Describe(const Set& set) {
+    std::string text = std::to_string(set.GetCategory()) + "|" + set.GetName() + "|" +
+                       set.GetValue() + "|" + set.GetLabel() + "|" +
+                       std::to_string(set.GetFlags()) + "|";
+    for (const std::string& v : set.GetVariables()) text += v + " ";
+    return text;
+}
+
+std::string LineOf(const Set& set) {
     std::string text;
     set.AppendLine(text);
     return text;
 }
 
-std::vector<std::string> Names(std::initializer_list<const char*> names) {
-    return std::vector<std::string>(names.begin(), names.end());
+std::string Parsed(std::string_view line) {
+    const auto set = Set::Parse(line);
+    return set ? Describe(*set) : "nothing";
 }
 
 }  // namespace
 
-TEST(VariableSetLine, ProducesEachForm) {
-    QORA_VariableSet drinks = Dichotomy("$drinks", "1", "Drinks");
-    drinks.AddVariable("tea");
-    drinks.AddVariable("coffee");
-    EXPECT_EQ(LineOf(drinks), "$drinks=D1 1 6 Drinks tea coffee\n");
-
-    drinks.SetExtended(true);
-    EXPECT_EQ(LineOf(drinks), "$drinks=E 1 1 1 6 Drinks tea coffee\n");
-    drinks.SetLabelLeftOut(true);
-    EXPECT_EQ(LineOf(drinks), "$drinks=E 11 1 1 0  tea coffee\n");
-    drinks.SetExtended(false);
-    EXPECT_EQ(LineOf(drinks), "$drinks=D1 1 0  tea coffee\n");
-
-    QORA_VariableSet colours(QORA_VariableSet::kMultipleCategory);
-    colours.SetName("$colours");
-    colours.SetLabel("Best colour");
-    colours.AddVariable("c1");
-    EXPECT_EQ(LineOf(colours), "$colours=C 11 Best colour c1\n");
-
-    QORA_VariableSet plain;
-    plain.SetName("Demographics");
-    plain.AddVariable("age");
-    plain.AddVariable("sex");
-    EXPECT_EQ(LineOf(plain), "Demographics= age sex\n");
+TEST(VariableSetLine, EachFormWrittenAndReadBack) {
+    const std::tuple<Set, const char*, const char*> rows[] = {
+        {Make(Set::kMultipleDichotomy, "$drinks", "1", "Drinks", {"tea", "coffee"}),
+         "$drinks=D1 1 6 Drinks tea coffee\n", "2|$drinks|1|Drinks|0|tea coffee "},
+        {Make(Set::kMultipleDichotomy, "$drinks", "1", "Drinks", {"tea"}, Set::kExtendedFlag),
+         "$drinks=E 1 1 1 6 Drinks tea\n", "2|$drinks|1|Drinks|1|tea "},
+        // A left-out label reads back empty; only the extended form keeps the flag.
+        {Make(Set::kMultipleDichotomy, "$d", "1", "Hidden", {"tea"}, 3), "$d=E 11 1 1 0  tea\n",
+         "2|$d|1||3|tea "},
+        {Make(Set::kMultipleDichotomy, "$d", "1", "Hidden", {"tea"}, Set::kLabelLeftOut),
+         "$d=D1 1 0  tea\n", "2|$d|1||0|tea "},
+        {Make(Set::kMultipleCategory, "$colours", "", "Best colour", {"c1"}),
+         "$colours=C 11 Best colour c1\n", "1|$colours||Best colour|0|c1 "},
+        {Make(Set::kVariableSet, "Demographics", "", "", {"age", "sex"}), "Demographics= age sex\n",
+         "0|Demographics|||0|age sex "},
+        // Blanks and "=" inside counted texts survive.
+        {Make(Set::kMultipleDichotomy, "$x", "yes please", "a = b  c", {"v1", "v2"}),
+         "$x=D10 yes please 8 a = b  c v1 v2\n", "2|$x|yes please|a = b  c|0|v1 v2 "},
+    };
+    for (const auto& [set, line, fields] : rows) {
+        EXPECT_EQ(LineOf(set), line);
+        EXPECT_EQ(Parsed(line), fields) << line;
+    }
+    EXPECT_THROW(LineOf(Make(Set::kMultipleDichotomy, "drinks", "1", "", {})), ErrorText);
+    EXPECT_THROW(LineOf(Make(Set::kMultipleDichotomy, "$drinks", "", "", {})), ErrorText);
+    EXPECT_THROW(LineOf(Set(Set::kMultipleCategory)), ErrorText);
 }
 
-TEST(VariableSetLine, ProducingRefusesBrokenSets) {
-    QORA_VariableSet noDollar = Dichotomy("drinks", "1", "");
-    EXPECT_THROW(LineOf(noDollar), ErrorText);
-    QORA_VariableSet noValue = Dichotomy("$drinks", "", "");
-    EXPECT_THROW(LineOf(noValue), ErrorText);
-    QORA_VariableSet unnamed(QORA_VariableSet::kMultipleCategory);
-    EXPECT_THROW(LineOf(unnamed), ErrorText);
-}
-
-TEST(VariableSetLine, RoundTripKeepsBlanksAndEqualsInCountedText) {
-    QORA_VariableSet set = Dichotomy("$x", "yes please", "a = b  c");
-    set.AddVariable("v1");
-    set.AddVariable("v2");
-    const auto back = QORA_VariableSet::Parse(LineOf(set));
-    ASSERT_TRUE(back);
-    EXPECT_EQ(back->GetCategory(), QORA_VariableSet::kMultipleDichotomy);
-    EXPECT_EQ(back->GetName(), "$x");
-    EXPECT_EQ(back->GetValue(), "yes please");
-    EXPECT_EQ(back->GetLabel(), "a = b  c");
-    EXPECT_EQ(back->GetVariables(), Names({"v1", "v2"}));
-    EXPECT_EQ(back->GetFlags(), 0u);
-}
-
-TEST(VariableSetLine, LeftOutLabelReadsBackEmpty) {
-    QORA_VariableSet set = Dichotomy("$x", "1", "Hidden");
-    set.SetLabelLeftOut(true);
-    set.AddVariable("a");
-    auto plain = QORA_VariableSet::Parse(LineOf(set));
-    ASSERT_TRUE(plain);
-    EXPECT_EQ(plain->GetLabel(), "");
-    EXPECT_EQ(plain->GetFlags(), 0u);
-    EXPECT_EQ(plain->GetVariables(), Names({"a"}));
-
-    set.SetExtended(true);
-    auto extended = QORA_VariableSet::Parse(LineOf(set));
-    ASSERT_TRUE(extended);
-    EXPECT_EQ(extended->GetLabel(), "");
-    EXPECT_TRUE(extended->IsExtended());
-    EXPECT_TRUE(extended->IsLabelLeftOut());
-}
-
-TEST(VariableSetLine, ParsesFlagDigitsAndVariableList) {
-    auto set = QORA_VariableSet::Parse("$m=E 10 1 7 0  a  b A\r\nignored");
-    ASSERT_TRUE(set);
-    EXPECT_EQ(set->GetFlags(), uint32_t{QORA_VariableSet::kExtendedFlag});
-    EXPECT_EQ(set->GetValue(), "7");
-    EXPECT_EQ(set->GetVariables(), Names({"a", "b"}));
-
-    auto category = QORA_VariableSet::Parse("$c=C 0  x y\n");
-    ASSERT_TRUE(category);
-    EXPECT_EQ(category->GetCategory(), QORA_VariableSet::kMultipleCategory);
-    EXPECT_EQ(category->GetVariables(), Names({"x", "y"}));
-
-    auto plain = QORA_VariableSet::Parse("Set one=p q");
-    ASSERT_TRUE(plain);
-    EXPECT_EQ(plain->GetCategory(), QORA_VariableSet::kVariableSet);
-    EXPECT_EQ(plain->GetName(), "Set one");
-    EXPECT_EQ(plain->GetVariables(), Names({"p", "q"}));
+TEST(VariableSetLine, ParsesFlagDigitsAndVariableLists) {
+    EXPECT_EQ(Parsed("$m=E 10 1 7 0  a  b A\r\nignored"), "2|$m|7||1|a b ");
+    EXPECT_EQ(Parsed("$c=C 0  x y\n"), "1|$c|||0|x y ");
+    EXPECT_EQ(Parsed("Set one=p q"), "0|Set one|||0|p q ");
 }
 
 TEST(VariableSetLine, MalformedLinesYieldNothing) {
@@ -152,33 +111,22 @@ TEST(VariableSetLine, MalformedLinesYieldNothing) {
         "$a=D1 1x0  v",                         // no blank after the value
         "$a=C1 L x",                            // no blank after the type
     };
-    for (const char* line : lines) EXPECT_FALSE(QORA_VariableSet::Parse(line)) << line;
-}
-
-TEST(VariableSetLine, MalformedLineNeverReadsPastItsEnd) {
+    for (const char* line : lines) EXPECT_EQ(Parsed(line), "nothing") << line;
     // The length claims bytes that lie beyond the view's end in memory.
     const std::string memory = "$a=C 5 L xyz tail";
-    EXPECT_FALSE(QORA_VariableSet::Parse(std::string_view(memory).substr(0, 10)));
+    EXPECT_EQ(Parsed(std::string_view(memory).substr(0, 10)), "nothing");
 }
 
-TEST(VariableSet, NameByCaseCode) {
-    QORA_VariableSet set;
-    set.SetName("MixEd");
-    EXPECT_EQ(set.GetName(QORA_VariableSet::kLowerCase), "mixed");
-    EXPECT_EQ(set.GetName(QORA_VariableSet::kUpperCase), "MIXED");
-    EXPECT_EQ(set.GetName(QORA_VariableSet::kAsStored), "MixEd");
+TEST(VariableSet, NamesByCaseCodeAndEditsCheckTheirIndex) {
+    Set set = Make(Set::kVariableSet, "MixEd", "", "", {"Age", "AGE", "sex"});  // case ignored
+    EXPECT_EQ(set.GetName(Set::kLowerCase), "mixed");
+    EXPECT_EQ(set.GetName(Set::kUpperCase), "MIXED");
+    EXPECT_EQ(set.GetName(Set::kAsStored), "MixEd");
     EXPECT_THROW(set.GetName(3), ErrorText);
-}
-
-TEST(VariableSet, AddVariableIgnoresCaseAndEditsCheckTheirIndex) {
-    QORA_VariableSet set;
-    set.AddVariable("Age");
-    set.AddVariable("AGE");
-    set.AddVariable("sex");
-    EXPECT_EQ(set.GetVariables(), Names({"Age", "sex"}));
+    EXPECT_EQ(Describe(set), "0|MixEd|||0|Age sex ");
     set.SetVariable(1, "gender");
     set.RemoveVariable(0);
-    EXPECT_EQ(set.GetVariables(), Names({"gender"}));
+    EXPECT_EQ(Describe(set), "0|MixEd|||0|gender ");
     EXPECT_THROW(set.RemoveVariable(1), ErrorText);
     EXPECT_THROW(set.SetVariable(1, "x"), ErrorText);
 }
@@ -195,80 +143,55 @@ TEST(VariableSetLoad, MultipleResponseFamilyReadsBothRecordsAndMerges) {
     source.SetRecord(kExtendedMultRespExtension, "$A=E 1 2 10 2 AA q r\n");
     source.SetRecord(kVariableSetExtension, "vs= a b\n");
 
+    // $A of the extended record replaces $a.
     const QORA_VariableSetList sets = LoadVariableSets(source, QORA_SetFamily::kMultipleResponse);
     ASSERT_EQ(sets.size(), 3u);
-    EXPECT_EQ(sets[0].GetName(), "$A");
-    EXPECT_EQ(sets[0].GetCategory(), QORA_VariableSet::kMultipleDichotomy);
-    EXPECT_TRUE(sets[0].IsExtended());
-    EXPECT_EQ(sets[0].GetValue(), "10");
-    EXPECT_EQ(sets[0].GetLabel(), "AA");
-    EXPECT_EQ(sets[0].GetVariables(), Names({"q", "r"}));
-    EXPECT_EQ(sets[1].GetName(), "$b");
-    EXPECT_EQ(sets[1].GetVariables(), Names({"p"}));
-    EXPECT_EQ(sets[2].GetName(), "$c");
-
+    EXPECT_EQ(Describe(sets[0]), "2|$A|10|AA|1|q r ");
+    EXPECT_EQ(Describe(sets[1]), "2|$b|1||0|p ");
+    EXPECT_EQ(Describe(sets[2]), "1|$c|||0|z ");
     const QORA_VariableSetList plain = LoadVariableSets(source, QORA_SetFamily::kVariableSets);
     ASSERT_EQ(plain.size(), 1u);
-    EXPECT_EQ(plain[0].GetName(), "vs");
+    EXPECT_EQ(Describe(plain[0]), "0|vs|||0|a b ");
     EXPECT_TRUE(LoadVariableSets(DictionaryOnly(), QORA_SetFamily::kVariableSets).empty());
 }
 
 TEST(VariableSetStore, RoutesEachSetToItsRecordAndRoundTrips) {
     DictionaryOnly source;
-    QORA_VariableSetList sets;
-    sets.push_back(Dichotomy("$d", "1 2", "Label"));
-    sets.back().AddVariable("a");
-    sets.push_back(Dichotomy("$e", "9", ""));
-    sets.back().SetExtended(true);
-    sets.back().AddVariable("b");
-    sets.emplace_back(QORA_VariableSet::kVariableSet);
-    sets.back().SetName("plain");
-    sets.back().AddVariable("c");
+    source.SetRecord(kVariableSetExtension, "old= x\n");
+    const QORA_VariableSetList sets = {
+        Make(Set::kMultipleDichotomy, "$d", "1 2", "Label", {"a"}),
+        Make(Set::kMultipleDichotomy, "$e", "9", "", {"b"}, Set::kExtendedFlag),
+        Make(Set::kVariableSet, "plain", "", "", {"c"})};
     StoreVariableSets(source, sets);
-
     EXPECT_EQ(source.Record(kMultRespExtension), "$d=D3 1 2 5 Label a\n");
     EXPECT_EQ(source.Record(kExtendedMultRespExtension), "$e=E 1 1 9 0  b\n");
     EXPECT_EQ(source.Record(kVariableSetExtension), "plain= c\n");
-    EXPECT_EQ(source.GetExtension(kMultRespExtension).Impl()->ElementSize(), 1);
-
     const QORA_VariableSetList mr = LoadVariableSets(source, QORA_SetFamily::kMultipleResponse);
     ASSERT_EQ(mr.size(), 2u);
-    EXPECT_EQ(mr[0].GetValue(), "1 2");
-    EXPECT_EQ(mr[1].GetFlags(), uint32_t{QORA_VariableSet::kExtendedFlag});
-}
+    EXPECT_EQ(Describe(mr[0]), Describe(sets[0]));
+    EXPECT_EQ(Describe(mr[1]), Describe(sets[1]));
 
-TEST(VariableSetStore, RecordsWithoutLinesAreLeftAsTheyWere) {
-    DictionaryOnly source;
-    source.SetRecord(kVariableSetExtension, "old= x\n");
-    source.SetRecord(kExtendedMultRespExtension, "$old=E 1 1 1 0  y\n");
-    QORA_VariableSetList sets{Dichotomy("$d", "1", "")};
-    sets.back().AddVariable("a");
-    StoreVariableSets(source, sets);
-    EXPECT_EQ(source.Record(kVariableSetExtension), "old= x\n");
-    EXPECT_EQ(source.Record(kExtendedMultRespExtension), "$old=E 1 1 1 0  y\n");
-    EXPECT_EQ(source.Record(kMultRespExtension), "$d=D1 1 0  a\n");
+    // A record no set has lines for is left as it was.
+    StoreVariableSets(source, {sets[0]});
+    EXPECT_EQ(source.Record(kExtendedMultRespExtension), "$e=E 1 1 9 0  b\n");
+    EXPECT_EQ(source.Record(kVariableSetExtension), "plain= c\n");
 }
 
 TEST(VariableSetPrune, RemovesUnknownNamesThenEmptySets) {
     DictionaryOnly source;
-    source.AddNumeric("age");
-    source.AddNumeric(std::string(64, 'L').c_str());
-    QORA_VariableSetList sets(3);
-    sets[0].SetName("keep");
-    sets[0].AddVariable("AGE");
-    sets[0].AddVariable("gone");
-    sets[0].AddVariable(std::string(64, 'l') + "tail");  // matched on its first 64 bytes
-    sets[1].SetName("empty");
-    sets[1].AddVariable("nothing");
-    sets[2].SetName("whole");
-    sets[2].AddVariable("Age");
-
+    for (const std::string& name : {std::string("age"), std::string(64, 'L')}) {
+        QORA_Variable var(0);
+        var.SetName(name.c_str());
+        source.AppendVariable(var);
+    }
+    const std::string longName = std::string(64, 'l') + "tail";  // matched on 64 bytes
+    QORA_VariableSetList sets = {
+        Make(Set::kVariableSet, "keep", "", "", {"AGE", "gone", longName.c_str()}),
+        Make(Set::kVariableSet, "empty", "", "", {"nothing"}),
+        Make(Set::kVariableSet, "whole", "", "", {"Age"})};
     EXPECT_TRUE(PruneVariableSets(sets, source));
     ASSERT_EQ(sets.size(), 2u);
-    EXPECT_EQ(sets[0].GetVariables(), Names({"AGE", (std::string(64, 'l') + "tail").c_str()}));
-    EXPECT_EQ(sets[1].GetName(), "whole");
+    EXPECT_EQ(Describe(sets[0]), "0|keep|||0|AGE " + longName + " ");
+    EXPECT_EQ(Describe(sets[1]), "0|whole|||0|Age ");
     EXPECT_FALSE(PruneVariableSets(sets, source));
-
-    QORA_VariableSetList none;
-    EXPECT_FALSE(PruneVariableSets(none, source));
 }
