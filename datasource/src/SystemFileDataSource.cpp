@@ -15,11 +15,6 @@
 #include "qoramb.h"
 #include "variableset.h"
 
-// A condition the file must meet, with the text the failure reports.
-#define SF_CHECK(number, cond, text) \
-    ((cond) ? static_cast<void>(0)   \
-            : throw SystemFileException((number), (text), __FILE__, __LINE__))
-
 namespace {
 
 using int32 = int32_t;
@@ -79,29 +74,30 @@ class DictionaryReader {
 int32 DictionaryReader::ReadInt(const char* condition) {
     int32 value = 0;
     const uint32_t len = Read(&value, sizeof value);
-    SF_CHECK(kErrTooShort, len == sizeof value, condition);
+    QORA_FILE_CHECK_TEXT(kErrTooShort, len == sizeof value, condition);
     return Int(value);
 }
 
 // size comes from the file: it is checked against what is left before the
 // buffer is made.
 void DictionaryReader::ReadRaw(std::string& bytes, int64_t size, const char* condition) {
-    SF_CHECK(kErrTooShort, size <= Remaining(), condition);
-    SF_CHECK(kErrBadFormat, size <= INT32_MAX, "size <= INT32_MAX");
+    QORA_FILE_CHECK_TEXT(kErrTooShort, size <= Remaining(), condition);
+    QORA_FILE_CHECK_TEXT(kErrBadFormat, size <= INT32_MAX, "size <= INT32_MAX");
     bytes.resize(size_t(size));
     const uint32_t len = Read(&bytes[0], uint32_t(size));
-    SF_CHECK(kErrTooShort, len == size, condition);
+    QORA_FILE_CHECK_TEXT(kErrTooShort, len == size, condition);
 }
 
 void DictionaryReader::ReadHeader() {
     char magic[5] = {};
     uint32_t nRead = Read(magic, 4);
-    SF_CHECK(kErrTooShort, nRead == 4, "nRead == 4");
-    SF_CHECK(kErrBadFormat, std::string(magic) == "$FL2", "std::string(magic) == \"$FL2\"");
+    QORA_FILE_CHECK_TEXT(kErrTooShort, nRead == 4, "nRead == 4");
+    QORA_FILE_CHECK_TEXT(kErrBadFormat, std::string(magic) == "$FL2",
+                         "std::string(magic) == \"$FL2\"");
     char h[HeaderSettings::kHeaderSize - 4];
     const uint32_t len1 = sizeof h;
     nRead = Read(h, len1);
-    SF_CHECK(kErrTooShort, nRead == len1, "nRead == len1");
+    QORA_FILE_CHECK_TEXT(kErrTooShort, nRead == len1, "nRead == len1");
 
     int32 layout, caseSize, compression, weight, caseCount;
     double bias;
@@ -131,7 +127,7 @@ void DictionaryReader::ReadRecords() {
     for (;;) {
         int32 recType = 0;
         const uint32_t len = Read(&recType, sizeof recType);
-        SF_CHECK(kErrTooShort, len == sizeof(recType), "len == sizeof(recType)");
+        QORA_FILE_CHECK_TEXT(kErrTooShort, len == sizeof(recType), "len == sizeof(recType)");
         recType = Int(recType);
         if (recType != kVariableRecord && !fVariablesClosed) CloseVariables();
         switch (recType) {
@@ -151,7 +147,7 @@ void DictionaryReader::ReadRecords() {
                 ReadInt("len == sizeof(padding)");
                 return;
             default:
-                SF_CHECK(kErrBadFormat, false, "false");
+                QORA_FILE_CHECK_TEXT(kErrBadFormat, false, "false");
         }
     }
 }
@@ -168,23 +164,24 @@ void DictionaryReader::CloseVariables() {
 
 void DictionaryReader::ReadVariable() {
     // The case layout is fixed once other records have begun.
-    SF_CHECK(kErrBadFormat, !fVariablesClosed, "!variablesClosed");
+    QORA_FILE_CHECK_TEXT(kErrBadFormat, !fVariablesClosed, "!variablesClosed");
     int32 f[5];
     char name[8];
     uint32_t len = Read(f, sizeof f);
     len += Read(name, sizeof name);
-    SF_CHECK(kErrTooShort, len == sizeof f + sizeof name, "len == 28");
+    QORA_FILE_CHECK_TEXT(kErrTooShort, len == sizeof f + sizeof name, "len == 28");
     const int32 type = Int(f[0]), hasLabel = Int(f[1]), code = Int(f[2]);
-    SF_CHECK(kErrBadFormat, type >= -1 && type <= kMaxFileVarType, "type >= -1 && type <= 255");
-    SF_CHECK(kErrBadFormat, QORA_Variable::IsValidMissingCode(code),
-             "QORA_Variable::IsValidMissingCode(code)");
-    SF_CHECK(kErrBadFormat, type < 0 || fSource.HasRoomFor(type), "HasRoomFor(type)");
+    QORA_FILE_CHECK_TEXT(kErrBadFormat, type >= -1 && type <= kMaxFileVarType,
+                         "type >= -1 && type <= 255");
+    QORA_FILE_CHECK_TEXT(kErrBadFormat, QORA_Variable::IsValidMissingCode(code),
+                         "QORA_Variable::IsValidMissingCode(code)");
+    QORA_FILE_CHECK_TEXT(kErrBadFormat, type < 0 || fSource.HasRoomFor(type), "HasRoomFor(type)");
 
     std::string label;
     int32 labelLen = 0;
     if (hasLabel != 0) {
         labelLen = ReadInt("len == sizeof(labelLen)");
-        SF_CHECK(kErrBadFormat, labelLen >= 0, "labelLen >= 0");
+        QORA_FILE_CHECK_TEXT(kErrBadFormat, labelLen >= 0, "labelLen >= 0");
         ReadRaw(label, 4 * ((int64_t(labelLen) + 3) / 4), "len == paddedLen");
     }
     std::string missing;
@@ -209,12 +206,12 @@ void DictionaryReader::ReadVariable() {
 void DictionaryReader::ReadValueLabels() {
     const int32 nLabels = ReadInt("len == sizeof(nLabels)");
     // Each pair takes at least 16 bytes.
-    SF_CHECK(kErrTooShort, nLabels <= Remaining() / 16, "len == header.size()");
+    QORA_FILE_CHECK_TEXT(kErrTooShort, nLabels <= Remaining() / 16, "len == header.size()");
     std::vector<std::pair<std::string, std::string>> pairs;
     for (int32 i = 0; i < nLabels; ++i) {
         std::array<char, 9> header;
         const uint32_t len = Read(header.data(), header.size());
-        SF_CHECK(kErrTooShort, len == header.size(), "len == header.size()");
+        QORA_FILE_CHECK_TEXT(kErrTooShort, len == header.size(), "len == header.size()");
         const uint8_t m = static_cast<uint8_t>(header[8]);
         const size_t paddedLen = ((m + 8) / 8) * 8 - 1;
         std::string label;
@@ -225,20 +222,21 @@ void DictionaryReader::ReadValueLabels() {
 
     int32 h[2];
     const uint32_t len = Read(h, sizeof h);
-    SF_CHECK(kErrTooShort, len == 2 * sizeof(int32), "len == 2*sizeof(int32)");
+    QORA_FILE_CHECK_TEXT(kErrTooShort, len == 2 * sizeof(int32), "len == 2*sizeof(int32)");
     h[0] = Int(h[0]);
     h[1] = Int(h[1]);
-    SF_CHECK(kErrBadFormat, h[0] == 4, "h[0] == 4");
-    SF_CHECK(kErrBadFormat, h[1] > 0, "h[1] > 0");
+    QORA_FILE_CHECK_TEXT(kErrBadFormat, h[0] == 4, "h[0] == 4");
+    QORA_FILE_CHECK_TEXT(kErrBadFormat, h[1] > 0, "h[1] > 0");
     const int32 nVars = h[1];
-    SF_CHECK(kErrTooShort, nVars <= Remaining() / 4, "len == nVars*sizeof(int32)");
+    QORA_FILE_CHECK_TEXT(kErrTooShort, nVars <= Remaining() / 4, "len == nVars*sizeof(int32)");
     std::vector<int32> slots(nVars);
     const uint32_t lenVars = Read(slots.data(), uint32_t(nVars) * 4);
-    SF_CHECK(kErrTooShort, lenVars == uint32_t(nVars) * 4, "len == nVars*sizeof(int32)");
+    QORA_FILE_CHECK_TEXT(kErrTooShort, lenVars == uint32_t(nVars) * 4,
+                         "len == nVars*sizeof(int32)");
     std::vector<int> indexes;
     for (int32 slot : slots) {
         const int index = fSlots.IndexOfSlot(Int(slot));
-        SF_CHECK(kErrBadFormat, index >= 0, "slots.IsValidSlot(slot)");
+        QORA_FILE_CHECK_TEXT(kErrBadFormat, index >= 0, "slots.IsValidSlot(slot)");
         indexes.push_back(index);
     }
 
@@ -256,7 +254,7 @@ void DictionaryReader::ReadValueLabels() {
 
 void DictionaryReader::ReadDocuments() {
     const int32 nLines = ReadInt("len == sizeof(nLines)");
-    SF_CHECK(kErrBadFormat, nLines >= 0, "nLines >= 0");
+    QORA_FILE_CHECK_TEXT(kErrBadFormat, nLines >= 0, "nLines >= 0");
     std::string text;
     ReadRaw(text, int64_t(nLines) * kDocumentLineSize, "len == nLines*80");
     fSource.SetExtensionContent(0, 1, int32(text.size()), text.data());
@@ -266,16 +264,16 @@ void DictionaryReader::ReadDocuments() {
 void DictionaryReader::ReadExtension() {
     int32 h[3];
     const uint32_t len = Read(h, sizeof h);
-    SF_CHECK(kErrTooShort, len == 3 * sizeof(int32), "len == 3*sizeof(int32)");
+    QORA_FILE_CHECK_TEXT(kErrTooShort, len == 3 * sizeof(int32), "len == 3*sizeof(int32)");
     for (int32& v : h) v = Int(v);
-    SF_CHECK(kErrBadFormat, h[1] > 0 && h[2] > 0, "h[1] > 0 && h[2] > 0");
+    QORA_FILE_CHECK_TEXT(kErrBadFormat, h[1] > 0 && h[2] > 0, "h[1] > 0 && h[2] > 0");
     const int64_t size = int64_t(h[1]) * h[2];
-    SF_CHECK(kErrTooShort, size <= Remaining(), "len == h[2]*h[1]");
-    SF_CHECK(kErrBadFormat, size <= INT32_MAX, "h[2]*h[1] <= INT32_MAX");
+    QORA_FILE_CHECK_TEXT(kErrTooShort, size <= Remaining(), "len == h[2]*h[1]");
+    QORA_FILE_CHECK_TEXT(kErrBadFormat, size <= INT32_MAX, "h[2]*h[1] <= INT32_MAX");
     if (h[0] == 16) fSource.NoteCaseCountRecord();
     SystemFileExtensionRecord record(h[1], h[2]);
     const uint32_t lenData = Read(record.Contents(), uint32_t(size));
-    SF_CHECK(kErrTooShort, lenData == size, "len == h[2]*h[1]");
+    QORA_FILE_CHECK_TEXT(kErrTooShort, lenData == size, "len == h[2]*h[1]");
     ImportExtension(h[0], fSource, fSettings, record);
 }
 

@@ -7,21 +7,21 @@
 
 // An internal failure with its text ("Datasource error # %ld involving %s").
 class ErrorText : public std::exception {
-public:
+  public:
     explicit ErrorText(std::string text, unsigned char flag = 1)
         : fText(std::move(text)), fFlag(flag) {}
     const char* what() const noexcept override { return fText.c_str(); }
     const std::string& Text() const { return fText; }
     unsigned char Flag() const { return fFlag; }
 
-private:
+  private:
     std::string fText;
     unsigned char fFlag;
 };
 
 // An expected failure of reading or writing a system file.
 class SystemFileException : public std::exception {
-public:
+  public:
     SystemFileException(long number, std::string condition, const char* file, int line);
     const char* what() const noexcept override { return fWhat.c_str(); }
     long Number() const { return fNumber; }
@@ -29,7 +29,7 @@ public:
     const char* File() const { return fFile; }
     int Line() const { return fLine; }
 
-private:
+  private:
     long fNumber;
     std::string fCondition;
     const char* fFile;
@@ -67,8 +67,9 @@ enum : long {
 #define QORA_ASSERT(cond) \
     ((cond) ? static_cast<void>(0) : RaiseAssertion(#cond, __FILE__, __LINE__))
 
-// A condition a file must meet; a violation is a format error of the file.
-#define QORA_FILE_CHECK(number, cond)                                     \
-    do {                                                                  \
-        if (!(cond)) throw SystemFileException((number), #cond, __FILE__, __LINE__); \
-    } while (0)
+// A condition a file must meet; a violation is a format error of the file,
+// reported with the given text (or the condition itself).
+#define QORA_FILE_CHECK_TEXT(number, cond, text) \
+    ((cond) ? static_cast<void>(0)               \
+            : throw SystemFileException((number), (text), __FILE__, __LINE__))
+#define QORA_FILE_CHECK(number, cond) QORA_FILE_CHECK_TEXT(number, cond, #cond)
