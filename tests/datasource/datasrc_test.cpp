@@ -270,16 +270,16 @@ TEST(DataSourceTest, CopiesShareVariablesUntilOneChanges) {
 TEST(DataSourceTest, ParentsAndAssignFrom) {
     TestSource parent;
     AddVariables(parent, {0, 20});
-    parent.SetFileName("p.sav");
+    parent.SetFileName("p.qsf");
     TestSource child(&parent);
     EXPECT_EQ(child.ValueCount(), 4);
-    EXPECT_EQ(child.GetFileName(), "p.sav");
+    EXPECT_EQ(child.GetFileName(), "p.qsf");
     EXPECT_EQ(TestSource(child).GetParent(), &parent);  // a copy keeps the parent
     EXPECT_THROW(child.SetParent(&child), ErrorText);
 
     TestSource other;
     AddVariables(other, {0, 9});
-    other.SetFileName("other.sav");
+    other.SetFileName("other.qsf");
     other.SetCaseWeight(1);
     child.SetIdString("old");
     child.AssignFrom(other);
