@@ -154,14 +154,39 @@ bool ParseOptions(int argc, char** argv, Options& options) {
 
 struct Variable {
     std::string name;
-    int type;  // 0 numeric, else the string width
+    int type;         // 0 numeric, else the string width
+    int printFormat;  // format type code
 };
+
+// Print format codes of numbers that hold a date, or a date and a time.
+bool IsDateFormat(int code) {
+    return code == 20 || code == 23 || code == 24 || code == 28 || code == 29 || code == 30 ||
+           code == 38 || code == 39;
+}
+bool IsDateTimeFormat(int code) { return code == 22; }
 
 // The shortest text that reads back as the same double.
 std::string NumberText(double value) {
     char text[32];
     auto result = std::to_chars(text, text + sizeof text, value);
     return std::string(text, result.ptr);
+}
+
+// A date value as yyyy-mm-dd (with hh:mm:ss when asked); a number that is no
+// date is shown as a number.
+std::string DateText(double value, bool withTime) {
+    int day = 0, month = 0, year = 0, days = 0, hour = 0, minute = 0;
+    double second = 0;
+    if (qoraConvertQORADate(&day, &month, &year, value) != QORA_STATUS_OK ||
+        qoraConvertQORATime(&days, &hour, &minute, &second, value) != QORA_STATUS_OK)
+        return NumberText(value);
+    char text[64];
+    if (withTime)
+        std::snprintf(text, sizeof text, "%04d-%02d-%02d %02d:%02d:%02d", year, month, day, hour,
+                      minute, int(second));
+    else
+        std::snprintf(text, sizeof text, "%04d-%02d-%02d", year, month, day);
+    return text;
 }
 
 std::string TrimBlanks(std::string text) {
@@ -186,7 +211,11 @@ std::vector<Variable> Variables(int handle) {
     std::vector<Variable> variables;
     if (Check(qoraGetVarNames(handle, &count, &names, &types), "listing the variables") != 0)
         return variables;
-    for (int i = 0; i < count; ++i) variables.push_back({names[i], types[i]});
+    for (int i = 0; i < count; ++i) {
+        int code = 0, decimals = 0, width = 0;
+        qoraGetVarPrintFormat(handle, names[i], &code, &decimals, &width);
+        variables.push_back({names[i], types[i], code});
+    }
     qoraFreeVarNames(names, types, count);
     return variables;
 }
@@ -310,7 +339,10 @@ std::string ValueText(int handle, int index, const Variable& var, std::vector<ch
     if (var.type == 0) {
         double value = 0;
         Check(qoraGetValueNumeric(handle, varHandle, &value), doing);
-        return value == qoraSysmisVal() ? std::string() : NumberText(value);
+        if (value == qoraSysmisVal()) return std::string();
+        if (IsDateFormat(var.printFormat)) return DateText(value, false);
+        if (IsDateTimeFormat(var.printFormat)) return DateText(value, true);
+        return NumberText(value);
     }
     Check(qoraGetValueChar(handle, varHandle, buffer.data(), int(buffer.size())), doing);
     return CsvField(TrimBlanks(buffer.data()));
