@@ -209,6 +209,10 @@ std::vector<Variable> Variables(int handle) {
     char** names = nullptr;
     int* types = nullptr;
     std::vector<Variable> variables;
+    // The name list refuses a file without variables, which is still a file.
+    if (Check(qoraGetNumberofVariables(handle, &count), "counting the variables") != 0 ||
+        count == 0)
+        return variables;
     if (Check(qoraGetVarNames(handle, &count, &names, &types), "listing the variables") != 0)
         return variables;
     for (int i = 0; i < count; ++i) {

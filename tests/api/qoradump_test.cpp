@@ -94,4 +94,11 @@ TEST(QoraDump, ErrorsNameTheStatusAndExitNonZero) {
     EXPECT_EQ(Dump("").exitCode, 2);
 }
 
+TEST(QoraDump, AFileWithoutVariablesIsStillAFile) {
+    fixture::SysFileBuilder b;
+    const DumpResult run = Dump(b.WriteTemp());
+    EXPECT_EQ(run.exitCode, 0) << run.output;
+    EXPECT_NE(run.output.find("Variables: 0\n"), std::string::npos) << run.output;
+}
+
 }  // namespace
