@@ -4,14 +4,12 @@
 #include <cstdint>
 #include <limits>
 
+#include "calendar.h"
 #include "qoraio32.h"
 
 namespace {
 
 constexpr double kSecondsPerDay = 86400.0;
-// Julian day numbers: the calendar's origin and day 0 of date values.
-constexpr int32_t kJulianOrigin = 1721119;
-constexpr int32_t kJulianDayZero = 2299160;
 // 2^63: from here on a date has no 64-bit second count.
 constexpr double kDateLimit = 9223372036854775808.0;
 
@@ -30,15 +28,9 @@ int QORA_API qoraConvertDate(int day, int month, int year, double* date) {
     if (month < 1 || month > 12 || year < 1582 || year > 9999 || day < 1 ||
         day > DaysInMonth(month, year))
         return QORA_STATUS_BAD_DATE;
-    // The year is counted from March, so that the leap day ends it.
-    const int32_t m = month >= 3 ? month - 3 : month + 9;
-    const int32_t y = month >= 3 ? year : year - 1;
-    const int32_t c = y / 100;
-    const int32_t r = y % 100;
-    const int32_t julian =
-        (146097 * c) / 4 + (1461 * r) / 4 + (153 * m + 2) / 5 + day + kJulianOrigin;
-    if (julian < kJulianDayZero) return QORA_STATUS_BAD_DATE;
-    *date = static_cast<double>(julian - kJulianDayZero) * kSecondsPerDay;
+    const int64_t days = GregorianDays(year, month, day);
+    if (days < 0) return QORA_STATUS_BAD_DATE;
+    *date = static_cast<double>(days) * kSecondsPerDay;
     return QORA_STATUS_OK;
 }
 
@@ -48,17 +40,12 @@ int QORA_API qoraConvertQORADate(int* day, int* month, int* year, double date) {
     if (day == nullptr || month == nullptr || year == nullptr || !(date >= 0.0) ||
         !(date < kDateLimit))
         return QORA_STATUS_BAD_DATE;
-    const int64_t n = static_cast<int64_t>(date) / 86400;
-    const int64_t j = (n + (kJulianDayZero - kJulianOrigin)) * 4 - 1;
-    const int64_t c = j / 146097;
-    const int64_t d = (j % 146097) / 4 * 4 + 3;
-    const int64_t y = d / 1461;
-    const int64_t e = ((d % 1461) + 4) / 4 * 5 - 3;
-    const int64_t m = e / 153;
-    const int64_t fullYear = 100 * c + y + (m >= 10 ? 1 : 0);
+    int64_t fullYear;
+    int fullMonth, fullDay;
+    GregorianDate(static_cast<int64_t>(date) / 86400, &fullYear, &fullMonth, &fullDay);
     if (fullYear > std::numeric_limits<int>::max()) return QORA_STATUS_BAD_DATE;
-    *day = static_cast<int>(((e % 153) + 5) / 5);
-    *month = static_cast<int>(m >= 10 ? m - 9 : m + 3);
+    *day = fullDay;
+    *month = fullMonth;
     *year = static_cast<int>(fullYear);
     return QORA_STATUS_OK;
 }

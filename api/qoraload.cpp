@@ -4,7 +4,6 @@
 #include <clocale>
 
 #include "handletable.h"
-#include "monthnames.h"
 #include "specialvalues.h"
 
 namespace {
@@ -18,9 +17,9 @@ struct UserLocale {
 const UserLocale gUserLocale;
 HandleTable gHandleTable;
 const SpecialValues gSpecialValues;
-const char* const kMonthAbbreviations[12] = {"Jan", "Feb", "Mar", "Apr", "May", "Jun",
-                                             "Jul", "Aug", "Sep", "Oct", "Nov", "Dec"};
-// Next, in this order: the extension record handler registry, then the lock of the locale lookup.
+// The month abbreviations are constant data of the library image. The
+// extension record handlers register themselves as their objects are made,
+// and the lock of the locale lookup is made beside that lookup.
 
 }  // namespace
 
@@ -29,7 +28,3 @@ HandleTable& TheHandleTable() { return gHandleTable; }
 double SysmisValue() { return gSpecialValues.fSysmis; }
 double LowestValue() { return gSpecialValues.fLowest; }
 double HighestValue() { return gSpecialValues.fHighest; }
-
-const char* MonthAbbreviation(int month) {
-    return month >= 1 && month <= 12 ? kMonthAbbreviations[month - 1] : nullptr;
-}

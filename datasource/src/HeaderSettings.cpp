@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <cstring>
 
+#include "calendar.h"
 #include "datasrc.h"
 #include "qoramb.h"
 #include "specialvalues.h"
@@ -36,24 +37,14 @@ double SwapDouble(double value) {
 
 namespace {
 
-const char* const kMonthNames[12] = {"jan", "feb", "mar", "apr", "may", "jun",
-                                     "jul", "aug", "sep", "oct", "nov", "dec"};
-
 // Digits are taken at face value: a character that is no digit simply makes
 // a number out of range.
 int TwoDigits(const char* p) { return 10 * (p[0] - '0') + (p[1] - '0'); }
 
 int MonthOf(const char* name) {
     for (int m = 0; m < 12; ++m)
-        if (mbEqualNoCase(name, 3, kMonthNames[m], 3, nullptr)) return m + 1;
+        if (mbEqualNoCase(name, 3, MonthAbbreviation(m + 1), 3, nullptr)) return m + 1;
     return 13;
-}
-
-// Days since 14 October 1582 in the proleptic Gregorian calendar.
-int64_t DaysSinceGregorianStart(int year, int month, int day) {
-    const int64_t m = month >= 3 ? month - 3 : month + 9;
-    const int64_t y = month >= 3 ? year : year - 1;
-    return (146097 * (y / 100)) / 4 + (1461 * (y % 100)) / 4 + (153 * m + 2) / 5 + day - 578041;
 }
 
 }  // namespace
@@ -67,7 +58,7 @@ bool ParseCreationStamp(const char* date, const char* time, double* stamp) {
     if (year < 1582 || year > 9999 || month < 1 || month > 12 || day < 1 || day > 31 || hour < 0 ||
         hour > 23 || minute < 0 || minute > 59 || second < 0 || second >= 60)
         return false;
-    const int64_t days = DaysSinceGregorianStart(year, month, day);
+    const int64_t days = GregorianDays(year, month, day);
     if (days < 0) return false;
     *stamp = double(days * 86400 + hour * 3600 + minute * 60 + second);
     return true;

@@ -4,6 +4,7 @@
 #include <cstring>
 #include <ctime>
 
+#include "calendar.h"
 #include "specialvalues.h"
 
 namespace {
@@ -13,15 +14,9 @@ double LocalTimeStamp() {
     const std::time_t now = std::time(nullptr);
     const std::tm* t = now == std::time_t(-1) ? nullptr : std::localtime(&now);
     if (!t) return 12379867200.0;
-    // Days from 1 March of year 0, shifted so that the start of 14 October
-    // 1582 is day 0.
-    const int month = t->tm_mon + 1;
-    const int m = month >= 3 ? month - 3 : month + 9;
-    const int64_t y = t->tm_year + 1900 - (month >= 3 ? 0 : 1);
-    const int64_t julian = (146097 * (y / 100)) / 4 + (1461 * (y % 100)) / 4 + (153 * m + 2) / 5 +
-                           t->tm_mday + 1721119;
+    const int64_t days = GregorianDays(t->tm_year + 1900, t->tm_mon + 1, t->tm_mday);
     const int64_t seconds = t->tm_hour * 3600 + t->tm_min * 60 + t->tm_sec;
-    return double((julian - 2299160) * 86400 + seconds);
+    return double(days * 86400 + seconds);
 }
 
 }  // namespace

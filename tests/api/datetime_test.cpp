@@ -4,7 +4,6 @@
 
 #include <limits>
 
-#include "monthnames.h"
 #include "qoraio32.h"
 
 namespace {
@@ -115,13 +114,6 @@ TEST(DateTime, DatesRoundTripEveryFewDaysUpToTheLast) {
         ASSERT_EQ(qoraConvertDate(day, month, year, &back), QORA_STATUS_OK);
         ASSERT_EQ(back, date) << day << "." << month << "." << year;
     }
-}
-
-TEST(MonthNames, CoverTheTwelveMonthsOnly) {
-    EXPECT_STREQ(MonthAbbreviation(1), "Jan");
-    EXPECT_STREQ(MonthAbbreviation(12), "Dec");
-    EXPECT_EQ(MonthAbbreviation(0), nullptr);
-    EXPECT_EQ(MonthAbbreviation(13), nullptr);
 }
 
 }  // namespace
