@@ -3,6 +3,7 @@
 #include <cstring>
 #include <string>
 
+#include "byteorder.h"
 #include "dserror.h"
 #include "filestream.h"
 #include "sparsefileindex.h"
@@ -29,13 +30,6 @@ const CodeTable kCodes;
 
 [[noreturn]] void TooShort(const char* condition, int line) {
     throw SystemFileException(kErrTooShort, condition, __FILE__, line);
-}
-
-void Reverse(unsigned char* unit) {
-    uint64_t bits;
-    std::memcpy(&bits, unit, 8);
-    bits = __builtin_bswap64(bits);
-    std::memcpy(unit, &bits, 8);
 }
 
 }  // namespace
@@ -151,7 +145,7 @@ uint32_t CompressedSystemFile::Decode(unsigned char* out, const unsigned char* s
             if (code == kRaw) {
                 if (kStore) {
                     std::memcpy(out + kUnitSize * cell, raw, kUnitSize);
-                    if (swapMask && swapMask[cell] == 1) Reverse(out + kUnitSize * cell);
+                    if (swapMask && swapMask[cell] == 1) ReverseUnit(out + kUnitSize * cell);
                 }
                 raw += kUnitSize;
             } else if (kStore) {

@@ -20,21 +20,6 @@ void HeaderSettings::BuildSwapMask(const QORA_DataSource& source) {
         if (!source.GetVariable(i).IsString()) fSwapMask[source.ValueOffset(i)] = 1;
 }
 
-void SwapBytes(void* bytes, size_t size) {
-    auto* p = static_cast<unsigned char*>(bytes);
-    std::reverse(p, p + size);
-}
-
-int32_t SwapInt32(int32_t value) {
-    SwapBytes(&value, sizeof value);
-    return value;
-}
-
-double SwapDouble(double value) {
-    SwapBytes(&value, sizeof value);
-    return value;
-}
-
 namespace {
 
 // Digits are taken at face value: a character that is no digit simply makes

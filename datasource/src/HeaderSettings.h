@@ -13,6 +13,7 @@
 #include <vector>
 
 #include "SystemFileDechunker.h"
+#include "byteorder.h"
 
 class QORA_DataSource;
 
@@ -63,11 +64,6 @@ struct HeaderSettings {
     // Marks the value unit of every numeric variable of the source.
     void BuildSwapMask(const QORA_DataSource& source);
 };
-
-// Byte reversal of the numbers of a file in the opposite order.
-int32_t SwapInt32(int32_t value);
-double SwapDouble(double value);
-void SwapBytes(void* bytes, size_t size);
 
 // The creation time stamp of the header's 9 date bytes ("04 Dec 26") and 8
 // time bytes ("17:16:43"), in seconds since 14 October 1582. False when the

@@ -5,6 +5,7 @@
 
 #include "CompressedSystemFile.h"
 #include "SystemFileDataSource.h"
+#include "byteorder.h"
 #include "dserror.h"
 
 namespace {
@@ -13,13 +14,6 @@ enum : uint32_t { kUnit = 8, kReadAhead = 256 * 1024 };
 
 [[noreturn]] void CaseCutShort(int line) {
     throw SystemFileException(kErrTooShort, "readLen== 0 || readLen == caseLen", __FILE__, line);
-}
-
-void Reverse(unsigned char* unit) {
-    uint64_t bits;
-    std::memcpy(&bits, unit, kUnit);
-    bits = __builtin_bswap64(bits);
-    std::memcpy(unit, &bits, kUnit);
 }
 
 // The units of one case in the file, as the dictionary reader counted them.
@@ -122,7 +116,7 @@ uint32_t SystemFileDataSource::Iterator::ReadRaw(unsigned char* destination) {
     const uint32_t got = fCaseBytes == 0 ? 0 : ReadAhead(destination);
     if (got != 0 && fpSwapMask != nullptr) {
         for (uint32_t u = 0; u < fCaseBytes / kUnit; ++u)
-            if (fpSwapMask[u] == 1) Reverse(destination + size_t{kUnit} * u);
+            if (fpSwapMask[u] == 1) ReverseUnit(destination + size_t{kUnit} * u);
     }
     return got;
 }
