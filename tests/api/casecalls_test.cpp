@@ -161,8 +161,6 @@ TEST_P(CaseCallsTest, SeeksOutsideTheFileAreRefusedOrFindTheEnd) {
     ExpectValues(1);
 }
 
-// A case cut short is an error each time it is asked for, and leaves no
-// half-read values behind.
 // A count that lies either way is the true one once the end was met.
 TEST_P(CaseCallsTest, TheCountOfTheHeaderGivesWayToTheCasesRead) {
     for (int32_t claimed : {9, 2}) {
@@ -183,6 +181,8 @@ TEST_P(CaseCallsTest, TheCountOfTheHeaderGivesWayToTheCasesRead) {
     }
 }
 
+// A case cut short is an error each time it is asked for, and leaves no
+// half-read values behind.
 TEST_P(CaseCallsTest, DataEndingInsideACaseFailsTheRead) {
     StandardCases(b, 3);
     const Bytes bytes = b.Build();
