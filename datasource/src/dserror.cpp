@@ -9,9 +9,7 @@ SystemFileException::SystemFileException(long number, std::string condition, con
     fWhat = "Datasource error # " + std::to_string(number) + " involving " + fCondition;
 }
 
-void RaiseError(long number) {
-    throw ErrorText("Datasource error # " + std::to_string(number));
-}
+void RaiseError(long number) { throw ErrorText("Datasource error # " + std::to_string(number)); }
 
 void RaiseError(long number, const std::string& what) {
     throw ErrorText("Datasource error # " + std::to_string(number) + " involving " + what);

@@ -4,7 +4,7 @@
 #include <cstdint>
 
 class QORA_StrBaseIO {
-public:
+  public:
     virtual ~QORA_StrBaseIO() = default;
     // Sets the good flag again after a failure.
     virtual void ClearError() = 0;

@@ -1,6 +1,6 @@
-#include <gtest/gtest.h>
-
 #include "dserror.h"
+
+#include <gtest/gtest.h>
 
 namespace {
 
