@@ -183,16 +183,10 @@ int QORA_API qoraSetVarCMissingValues(int handle, const char* name, int count, c
         if (count < 0 || count > 3) return QORA_STATUS_BAD_MISSING_SPEC;
         if (!var.IsString()) return QORA_STATUS_STRING_REQUIRED;
         if (var.GetType() > kMaxShortString) return QORA_STATUS_SHORT_STRING_REQUIRED;
-        // Missing values are compared byte for byte with a value's first 8
-        // bytes, so they are cut as bytes, not at character boundaries.
+        // Within the count a null value counts as empty; beyond it, none is set.
         const char* values[3] = {value1, value2, value3};
-        char fields[3][8];
-        for (int k = 0; k < 3; ++k) {
-            std::memset(fields[k], ' ', sizeof fields[k]);
-            if (k < count && values[k] != nullptr)
-                std::memcpy(fields[k], values[k], strnlen(values[k], sizeof fields[k]));
-        }
-        var.SetMissingValues(count, fields[0], fields[1], fields[2]);
+        for (int k = 0; k < 3; ++k) values[k] = k < count ? (values[k] ? values[k] : "") : nullptr;
+        var.SetMissingStrings(values[0], values[1], values[2]);
         return QORA_STATUS_OK;
     });
 }
