@@ -42,6 +42,10 @@ struct HeaderSettings {
     std::vector<std::pair<std::string, std::string>> fNameList;
     // Flag s: a type 7 record of subtype s was read; flag 0: documents were.
     std::bitset<eMaxSeenSubtype> fRecordsSeen;
+    // Writing: the (dictionary index, width) of each very long string, in
+    // dictionary order, that the export of the very long strings record split
+    // into segments; the writer reshapes each case to match.
+    std::vector<std::pair<int, int>> fVeryLongStrings;
     // Joins very long strings from their segments; null when the file has none.
     std::unique_ptr<SystemFileDechunker> fpDechunker;
     // One byte per value unit, 1 for a unit holding a number; made only for a

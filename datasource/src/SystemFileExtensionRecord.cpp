@@ -51,9 +51,10 @@ SystemFileExtensionHandler* FindExtensionHandler(int32_t subtype) {
     return subtype >= 0 && size_t(subtype) < registry.size() ? registry[subtype] : nullptr;
 }
 
-void ExportExtension(int32_t subtype, QORA_DataSource& source, SystemFileExtensionRecord& record) {
+void ExportExtension(int32_t subtype, QORA_DataSource& source, HeaderSettings& settings,
+                     SystemFileExtensionRecord& record) {
     if (SystemFileExtensionHandler* handler = FindExtensionHandler(subtype)) {
-        handler->Export(source, record);
+        handler->Export(source, settings, record);
         return;
     }
     if (!source.HasExtension(subtype)) return;

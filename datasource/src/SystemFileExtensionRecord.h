@@ -42,9 +42,11 @@ class SystemFileExtensionRecord {
 class SystemFileExtensionHandler {
   public:
     virtual ~SystemFileExtensionHandler() = default;
-    // Fills an empty record from the dictionary; leaves the unit count at 0
-    // when there is nothing to write.
-    virtual void Export(QORA_DataSource& source, SystemFileExtensionRecord& record) = 0;
+    // Fills an empty record from the dictionary of the file being written
+    // (the writer's own copy, which the handler may reshape) and the file's
+    // settings; leaves the unit count at 0 when there is nothing to write.
+    virtual void Export(QORA_DataSource& source, HeaderSettings& settings,
+                        SystemFileExtensionRecord& record) = 0;
     // Applies a record that was read. The settings tell whether the file's
     // numbers are in the opposite byte order; the handler reverses its own.
     virtual void Import(QORA_DataSource& source, HeaderSettings& settings,
@@ -58,7 +60,8 @@ SystemFileExtensionHandler* FindExtensionHandler(int32_t subtype);
 
 // The registered handler's Export, else a copy of the record stored for the
 // subtype, else nothing (the record stays empty).
-void ExportExtension(int32_t subtype, QORA_DataSource& source, SystemFileExtensionRecord& record);
+void ExportExtension(int32_t subtype, QORA_DataSource& source, HeaderSettings& settings,
+                     SystemFileExtensionRecord& record);
 // The registered handler's Import, else the record is stored whole. Either
 // way the subtype is noted as seen.
 void ImportExtension(int32_t subtype, QORA_DataSource& source, HeaderSettings& settings,

@@ -9,6 +9,29 @@
 
 #include "refcnt.h"
 
+// The subtypes of the type 7 records a system file may carry; type 0 is the
+// document text, which a file keeps in a record of its own.
+enum ExtensionSubtype : int32_t {
+    kDocumentExtension = 0,
+    kIntegerInfoExtension = 3,
+    kFloatInfoExtension = 4,
+    kVariableSetExtension = 5,
+    kDateInfoExtension = 6,
+    kMultRespExtension = 7,
+    kKIVExtension = 8,
+    kTextInfoExtension = 10,
+    kDisplayExtension = 11,
+    kKIVIdExtension = 12,
+    kLongNamesExtension = 13,
+    kVeryLongStringsExtension = 14,
+    kCaseCountExtension = 16,
+    kFileAttributesExtension = 17,
+    kVariableAttributesExtension = 18,
+    kExtendedMultRespExtension = 19,
+    kEncodingExtension = 20,
+    kLongValueLabelsExtension = 21,
+};
+
 class QORA_ExtensionImpl : public QORA_RefCntObject {
   public:
     // Copies elementSize * nElements bytes of content (absent: empty record).

@@ -11,6 +11,8 @@
 #include <string_view>
 #include <vector>
 
+#include "extension.h"
+
 class QORA_DataSource;
 
 class QORA_VariableSet {
@@ -86,13 +88,6 @@ using QORA_VariableSetList = std::vector<QORA_VariableSet>;
 enum class QORA_SetFamily {
     kMultipleResponse,  // types 7 then 19
     kVariableSets,      // type 5
-};
-
-// Extension types that hold the sets.
-enum : int32_t {
-    kVariableSetExtension = 5,
-    kMultRespExtension = 7,
-    kExtendedMultRespExtension = 19,
 };
 
 // All sets of one family stored in the data source, in record order. A later

@@ -16,7 +16,7 @@ class Source : public QORA_DataSource {
 // Records what it was given; exports three bytes.
 class RecordingHandler : public SystemFileExtensionHandler {
   public:
-    void Export(QORA_DataSource&, SystemFileExtensionRecord& record) override {
+    void Export(QORA_DataSource&, HeaderSettings&, SystemFileExtensionRecord& record) override {
         record.SetUnitSize(1);
         record.SetNUnits(3);
         record.SetContents("abc");
@@ -92,18 +92,19 @@ TEST(ExtensionRegistry, ExportTakesTheHandlerOverStorage) {
     Source source;
     source.SetExtensionContent(kHandled, 1, 5, "store");
     source.SetExtensionContent(kUnhandled, 4, 2, "abcdefgh");
+    HeaderSettings settings;
 
     SystemFileExtensionRecord handled;
-    ExportExtension(kHandled, source, handled);
+    ExportExtension(kHandled, source, settings, handled);
     EXPECT_EQ(std::string(reinterpret_cast<const char*>(handled.Contents()), 3), "abc");
 
     SystemFileExtensionRecord stored;
-    ExportExtension(kUnhandled, source, stored);
+    ExportExtension(kUnhandled, source, settings, stored);
     EXPECT_EQ(stored.UnitSize(), 4);
     EXPECT_EQ(stored.NUnits(), 2);
     EXPECT_EQ(std::memcmp(stored.Contents(), "abcdefgh", 8), 0);
 
     SystemFileExtensionRecord absent;
-    ExportExtension(12, source, absent);
+    ExportExtension(12, source, settings, absent);
     EXPECT_TRUE(absent.IsEmpty());
 }
