@@ -19,8 +19,6 @@ class QORA_DataSource;
 
 struct HeaderSettings {
     enum { eMaxSeenSubtype = 100 };
-    // Sizes of the header and of its text fields.
-    enum { kHeaderSize = 176, kProductSize = 60, kDateSize = 9, kTimeSize = 8, kLabelSize = 64 };
 
     HeaderSettings();
 

@@ -128,7 +128,3 @@ class SystemFileDataSource::Iterator : public QORA_InputCaseIterator {
 // Opens a system file for reading. The name is in the interface encoding;
 // warnings go to the sink when one is given.
 std::unique_ptr<QORA_DataSource> OpenForReading(const char* fileName, WarningSink* warnings);
-
-// Gives every variable whose name is not a valid name, or repeats an earlier
-// one, a new name v1, v2, ... that no other variable has.
-void RepairNames(QORA_DataSource& source);

@@ -7,11 +7,6 @@ namespace {
 const char* const kReservedWords[] = {"ALL", "AND", "BY",  "EQ", "GE", "GT",  "LE",
                                       "LT",  "NE",  "NOT", "OR", "TO", "WITH"};
 
-bool IsAsciiNameChar(unsigned char c) {
-    return (c >= 'A' && c <= 'Z') || (c >= 'a' && c <= 'z') || (c >= '0' && c <= '9') || c == '@' ||
-           c == '#' || c == '$' || c == '_' || c == '.';
-}
-
 bool IsReservedWord(const char* name, size_t length) {
     if (length >= 5) return false;
     for (const char* word : kReservedWords) {
@@ -21,6 +16,11 @@ bool IsReservedWord(const char* name, size_t length) {
 }
 
 }  // namespace
+
+bool IsAsciiNameChar(unsigned char c) {
+    return (c >= 'A' && c <= 'Z') || (c >= 'a' && c <= 'z') || (c >= '0' && c <= '9') || c == '@' ||
+           c == '#' || c == '$' || c == '_' || c == '.';
+}
 
 int QORA_CheckVariableName(const char* name, size_t length) {
     while (length > 0 && name[length - 1] == ' ') --length;

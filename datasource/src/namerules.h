@@ -18,3 +18,7 @@ enum {
 // Checks length bytes of name (trailing blanks not counted) in the interface
 // encoding; never reads past length.
 int QORA_CheckVariableName(const char* name, size_t length);
+
+// Whether an ASCII byte may stand in a name; bytes of 0x80 and above belong
+// to the characters of the encoding and are judged as such.
+bool IsAsciiNameChar(unsigned char c);

@@ -1,0 +1,102 @@
+#include "ReaderRepairs.h"
+
+#include <algorithm>
+#include <set>
+#include <string>
+#include <vector>
+
+#include "datasrc.h"
+#include "namerules.h"
+#include "qoramb.h"
+#include "variableset.h"
+
+namespace {
+
+enum { kMaxNameSize = 64 };
+
+// Whether a name can stand as it is: valid characters only, and no leading
+// character that marks a scratch or system name.
+bool IsAcceptableName(const std::string& name) {
+    if (name.empty()) return false;
+    const unsigned char first = name[0];
+    if (first == '#' || first == '$' || first == '_' || first == '.') return false;
+    for (size_t at = 0; at < name.size();) {
+        const int n = mbCharLength(name.data() + at, std::min<size_t>(4, name.size() - at));
+        if (n <= 0) return false;
+        const unsigned char c = static_cast<unsigned char>(name[at]);
+        if (n == 1 && c < 0x80 && !IsAsciiNameChar(c)) return false;
+        at += size_t(n);
+    }
+    return true;
+}
+
+// Lower-cases the names of a file that has no long names record.
+void LowerCaseNames(QORA_DataSource& source) {
+    for (int i = 0; i < source.ColumnCount(); ++i) {
+        QORA_Variable& var = source.GetVariable(i);
+        const std::string& name = var.GetName();
+        char lower[kMaxNameSize + 1] = {};
+        int error = 0;
+        const int n = mbToLower(name.data(), int(name.size()), lower, kMaxNameSize, &error);
+        var.SetName(lower, size_t(std::clamp(n, 0, int(kMaxNameSize))));
+    }
+}
+
+const QORA_SetFamily kSetFamilies[] = {QORA_SetFamily::kVariableSets,
+                                       QORA_SetFamily::kMultipleResponse};
+
+// Sets may name variables the file does not have: those names go, and the
+// records of a family that lost any are written again from what is left.
+void PruneStoredSets(QORA_DataSource& source) {
+    for (QORA_SetFamily family : kSetFamilies) {
+        QORA_VariableSetList sets = LoadVariableSets(source, family);
+        if (!PruneVariableSets(sets, source)) continue;
+        if (family == QORA_SetFamily::kVariableSets) {
+            source.SetExtensionContent(kVariableSetExtension, 1, 0, nullptr);
+        } else {
+            source.SetExtensionContent(kMultRespExtension, 1, 0, nullptr);
+            source.SetExtensionContent(kExtendedMultRespExtension, 1, 0, nullptr);
+        }
+        StoreVariableSets(source, sets);
+    }
+}
+
+// After the names changed their case, the sets are written again.
+void RestoreSets(QORA_DataSource& source) {
+    for (QORA_SetFamily family : kSetFamilies) {
+        const QORA_VariableSetList sets = LoadVariableSets(source, family);
+        if (!sets.empty()) StoreVariableSets(source, sets);
+    }
+}
+
+}  // namespace
+
+void RepairNames(QORA_DataSource& source) {
+    // Names are compared by their lookup keys, so that names differing only in
+    // case, which no lookup can tell apart, count as repeats too.
+    std::set<std::string> keys;
+    std::vector<int> marked;
+    for (int i = 0; i < source.ColumnCount(); ++i) {
+        const QORA_Variable& var = source.GetVariable(i);
+        if (!IsAcceptableName(var.GetName()) || !keys.insert(var.GetKey()).second)
+            marked.push_back(i);
+    }
+    int counter = 0;
+    for (int index : marked) {
+        std::string candidate;
+        do candidate = "V" + std::to_string(++counter);
+        while (keys.count(candidate));
+        keys.insert(candidate);
+        candidate[0] = 'v';
+        source.GetVariable(index).SetName(candidate.c_str());
+    }
+}
+
+void RepairAfterReading(QORA_DataSource& source, bool longNamesSeen) {
+    PruneStoredSets(source);
+    RepairNames(source);
+    if (!longNamesSeen) {
+        LowerCaseNames(source);
+        RestoreSets(source);
+    }
+}
