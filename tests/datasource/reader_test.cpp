@@ -152,6 +152,47 @@ TEST_P(Reader, ValueLabelSetsAreSharedAndTyped) {
     EXPECT_EQ(empty.Count(), 0);
 }
 
+// One record listing variables of both kinds and several widths: each
+// variable gets labels of its own kind and width, found by their own values.
+TEST_P(Reader, ValueLabelsServeOnlyVariablesOfTheirKindAndWidth) {
+    SysFileBuilder b(GetParam());
+    const int s20 = b.String("S20", 20).Slot();
+    const int n = b.Numeric("N").Slot();
+    const int s3 = b.String("S3", 3).Slot();
+    const int t20 = b.String("T20", 20).Slot();
+    b.ValueLabels({{"ABCDEFGH", "long"}, {"AB", "short"}}, {s20, n, s3, t20});
+    auto source = OpenFixture(b.WriteTemp());
+
+    EXPECT_FALSE(source->GetVariable(1).GetValueLabels().IsValid());
+    const QORA_VLMap wide = source->GetVariable(0).GetValueLabels();
+    EXPECT_TRUE(wide.SameObject(source->GetVariable(3).GetValueLabels()));
+    const QORA_VLMap narrow = source->GetVariable(2).GetValueLabels();
+    ASSERT_EQ(wide.KeyType(), 20);
+    ASSERT_EQ(narrow.KeyType(), 3);
+    for (QORA_VLMap map : {wide, narrow}) {
+        std::string text, label;
+        int count = 0;
+        for (map.Reset(); map.NextText(text, label); ++count) {
+            ASSERT_EQ(int(text.size()), map.KeyType());
+            ASSERT_NE(map.Lookup(text.data(), int(text.size())), nullptr) << text;
+            EXPECT_EQ(*map.Lookup(text.data(), int(text.size())), label);
+        }
+        EXPECT_EQ(count, 2);
+    }
+}
+
+// A string has no range of missing values: a file that codes one keeps the
+// values as discrete ones.
+TEST_P(Reader, StringMissingRangesBecomeDiscreteValues) {
+    SysFileBuilder b(GetParam());
+    b.String("S", 8).MissingRaw(-3, {"lo", "hi", "x"});
+    b.String("T", 8).MissingRaw(-2, {"a", "b"});
+    auto source = OpenFixture(b.WriteTemp());
+    EXPECT_EQ(Describe(source->GetVariable(0)),
+              "s|8|(none)|3|lo      ,hi      ,x       ,|1.8.0|1.8.0");
+    EXPECT_EQ(source->GetVariable(1).GetMissingCode(), 2);
+}
+
 TEST_P(Reader, WeightNamesTheFirstUnitOfAVariableOrNothing) {
     SysFileBuilder b(GetParam());
     b.String("S", 20);
