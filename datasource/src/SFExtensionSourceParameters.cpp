@@ -11,15 +11,14 @@
 
 namespace {
 
-// Integer information, 8 int32 units. The byte-order unit is not kept: it
-// always tells the machine's own order (least significant byte first).
+// Integer information, 8 int32 units. The byte-order unit is not kept.
 class SFExtensionSourceParametersInt : public SystemFileExtensionHandler {
   public:
     void Export(QORA_DataSource&, HeaderSettings& settings,
                 SystemFileExtensionRecord& rec) override {
         int32_t units[kUnits];
         for (int k = 0; k < kUnits; ++k)
-            units[k] = kFields[k] ? settings.*kFields[k] : kLeastSignificantFirst;
+            units[k] = kFields[k] ? settings.*kFields[k] : kByteOrderCode;
         rec.SetUnits(units, kUnits);
     }
 
@@ -32,7 +31,9 @@ class SFExtensionSourceParametersInt : public SystemFileExtensionHandler {
     }
 
   private:
-    enum { kUnits = 8, kLeastSignificantFirst = 2 };
+    enum { kUnits = 8 };
+    // The machine's own order: least significant byte first.
+    enum { kByteOrderCode = 2 };
     static constexpr int32_t HeaderSettings::*kFields[kUnits] = {&HeaderSettings::fReleaseMajor,
                                                                  &HeaderSettings::fReleaseMinor,
                                                                  &HeaderSettings::fReleaseRevision,
