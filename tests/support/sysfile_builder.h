@@ -233,6 +233,8 @@ class SysFileBuilder {
     Bytes Block(std::array<uint8_t, 8> codes, const std::vector<Value>& raws) const;
 
     Bytes Build() const;
+    // The bytes of the dictionary record added last (not a variable).
+    const Bytes& LastRecord() const { return fRecords.back().bytes; }
     size_t DataStart() const;  // offset of the first byte of the case data
     // Writes into a directory of the running test, removed with the builder.
     std::string WriteTemp(const std::string& fileName = "fixture.qsf") const;

@@ -1,0 +1,163 @@
+// The records with handlers of their own: bytes written against the layout
+// and read back, files of both byte orders read, malformed records refused.
+#include <gtest/gtest.h>
+
+#include <array>
+#include <string>
+#include <tuple>
+#include <utility>
+
+#include "SFExtensionEncoding.h"
+#include "SystemFileExtensionRecord.h"
+#include "reader_support.h"
+
+using namespace fixture;
+
+namespace {
+
+// A value with the separators of the variable attributes record in it.
+const std::string kUnit = SysFileBuilder::AttributeText({{"Unit", {"km/h:"}}});
+
+SystemFileExtensionRecord Exported(int32_t subtype, SystemFileDataSource& source) {
+    SystemFileExtensionRecord record;
+    ExportExtension(subtype, source, source.Settings(), record);
+    return record;
+}
+
+// The record as a file holds it, framed by the builder; empty when there is none.
+Bytes Framed(int32_t subtype, const SystemFileExtensionRecord& record) {
+    if (record.IsEmpty()) return {};
+    const std::string text = record.Text();
+    return SysFileBuilder()
+        .Extension(subtype, record.UnitSize(), record.NUnits(), Bytes(text.begin(), text.end()))
+        .LastRecord();
+}
+
+class ExtensionRecordFiles : public ByteOrders {};
+INSTANTIATE_TEST_SUITE_P(Orders, ExtensionRecordFiles,
+                         ::testing::Values(Endian::Native, Endian::Swapped), EndianName);
+
+}  // namespace
+
+TEST(ExtensionRecords, ExportFollowsTheLayoutAndReadsBack) {
+    SystemFileDataSource written, read;
+    for (int32_t subtype : {kDisplayExtension, kFileAttributesExtension, kEncodingExtension})
+        EXPECT_TRUE(Exported(subtype, written).IsEmpty()) << subtype;  // nothing to write
+    int index;
+    for (SystemFileDataSource* source : {&written, &read}) {
+        source->NewVariable(0, &index).SetName("age");
+        source->NewVariable(20, &index).SetName("Income");
+    }
+    Attributes unit;
+    unit.Set("Unit", {"km/h:"});
+    QORA_Variable &age = written.GetVariable(0), &income = written.GetVariable(1);
+    age.SetMeasureLevel(3);
+    age.SetColumnWidth(12);
+    age.SetAlignment(1);
+    age.SetAttributes(unit);
+    income.SetAttributes(unit);
+    written.FileAttributes() = unit;
+    HeaderSettings& s = written.Settings();
+    s.fReleaseMajor = 21, s.fReleaseMinor = 1, s.fReleaseRevision = 2, s.fCaseCount = 42;
+    s.fSysmis = 0.0;  // never written: the library's constants are
+    s.fEncodingName = "UTF-8";
+    SetCharacterCodeFromEncoding(s);
+
+    SysFileBuilder b;
+    const std::pair<int32_t, Bytes> rows[] = {
+        {kIntegerInfoExtension, b.IntegerInfo({21, 1, 2, 720, 1, 1, 2, 65001}).LastRecord()},
+        {kFloatInfoExtension, b.FloatInfo().LastRecord()},
+        {kDisplayExtension, b.DisplayParams({{3, 12, 1},
+                                             {income.GetMeasureLevel(), income.GetColumnWidth(),
+                                              income.GetAlignment()}})
+                                .LastRecord()},
+        {kCaseCountExtension, b.CaseCount64(42).LastRecord()},
+        {kFileAttributesExtension, b.FileAttributes(kUnit).LastRecord()},
+        {kVariableAttributesExtension,
+         b.VariableAttributes({{"age", kUnit}, {"Income", kUnit}}).LastRecord()},
+        {kEncodingExtension, b.Encoding("UTF-8").LastRecord()},
+    };
+    // What was read writes the same record again.
+    for (const auto& [subtype, expected] : rows) {
+        const SystemFileExtensionRecord record = Exported(subtype, written);
+        EXPECT_EQ(Framed(subtype, record), expected) << subtype;
+        ImportExtension(subtype, read, read.Settings(), record);
+        EXPECT_EQ(Framed(subtype, Exported(subtype, read)), expected) << subtype;
+    }
+}
+
+TEST_P(ExtensionRecordFiles, SettingsDisplayAndAttributesAreRead) {
+    SysFileBuilder b(GetParam());
+    b.Numeric("A");
+    b.Numeric("B");
+    b.String("C", 12);
+    b.IntegerInfo({21, 1, 2, 730, 3, 4, 1, 65001}).FloatInfo(-1.5, 2.5, -1.25);
+    b.DisplayParams({{3, 12, 1}, {1, 0, 2}, {5, 70000, 7}});
+    const std::string encoding = "x-unknown " + std::string(300, 'e');
+    b.Encoding(encoding);
+    b.FileAttributes(kUnit).FileAttributes("Note('x");  // the second does not parse
+    b.TextExtension(kVariableAttributesExtension, ":" + kUnit + "/A:" + kUnit);  // no first name
+    // An unknown variable is skipped; the first item that does not parse ends the record.
+    b.VariableAttributes({{"nobody", kUnit}, {"b", kUnit}, {"C", "Unit(x)\n"}, {"A", kUnit}});
+    auto source = OpenFixture(b.WriteTemp());
+
+    const HeaderSettings& s = source->Settings();
+    EXPECT_EQ(std::tie(s.fReleaseMajor, s.fReleaseMinor, s.fReleaseRevision, s.fMachineCode,
+                       s.fFloatCode, s.fCompressionCode, s.fCharacterCode),
+              std::make_tuple(21, 1, 2, 730, 3, 4, 65001));
+    EXPECT_EQ(std::tie(s.fSysmis, s.fHighest, s.fLowest), std::make_tuple(-1.5, 2.5, -1.25));
+    EXPECT_EQ(s.fEncodingName, encoding);
+    EXPECT_EQ(source->FileAttributes().ValuesOf("Unit"), Attributes::Values{"km/h:"});
+    // Width 0 keeps the variable's own; level and alignment keep 2 bits, width 16.
+    const std::array<int, 4> expected[3] = {
+        {3, 12, 1, 0}, {1, QORA_Variable(0).GetColumnWidth(), 2, 1}, {1, 70000 & 0xFFFF, 3, 0}};
+    for (int k = 0; k < 3; ++k) {
+        const QORA_Variable& v = source->GetVariable(k);
+        EXPECT_EQ((std::array<int, 4>{v.GetMeasureLevel(), v.GetColumnWidth(), v.GetAlignment(),
+                                      v.GetAttributes().Size()}),
+                  expected[k]);
+    }
+}
+
+TEST_P(ExtensionRecordFiles, CaseCountFollowsItsMarkerAndOnlyRises) {
+    auto reversed = [](int64_t v) { return int64_t(__builtin_bswap64(uint64_t(v))); };
+    // header count, record count, marker (0: a record of one unit), result
+    const std::array<int64_t, 4> rows[] = {
+        {-1, reversed(9), reversed(1), 9}, {7, 5, 1, 7}, {7, 9, 1, 9}, {-1, 9, 0, 9}};
+    for (const auto& [header, count, marker, expected] : rows) {
+        SysFileBuilder b(GetParam());
+        b.header().caseCount = int32_t(header);
+        if (marker == 0)
+            b.Extension(kCaseCountExtension, 8, b.Int64(count));
+        else
+            b.CaseCount64(count, marker);
+        EXPECT_EQ(OpenFixture(b.WriteTemp())->Settings().fCaseCount, expected) << count;
+    }
+}
+
+TEST_P(ExtensionRecordFiles, MalformedRecordsFailTheOpen) {
+    const std::tuple<int32_t, int32_t, int32_t, std::string> rows[] = {
+        {kIntegerInfoExtension, 4, 7, "rec.NUnits() == 8"},
+        {kIntegerInfoExtension, 8, 8, "rec.UnitSize() == 4"},
+        {kFloatInfoExtension, 4, 3, "rec.UnitSize() == sizeof(double)"},
+        {kFloatInfoExtension, 8, 4, "rec.NUnits() == 3"},
+        {kDisplayExtension, 8, 6, "rec.UnitSize() == sizeof(int32)"},
+        {kDisplayExtension, 4, 3, "rec.NUnits()== src.ColumnCount()*3"},
+        {kCaseCountExtension, 4, 4, "rec.UnitSize() == sizeof(int64)"},
+        {kCaseCountExtension, 8, 3, "rec.NUnits() == 1 || rec.NUnits() == 2"},
+        {kFileAttributesExtension, 2, 4, "rec.UnitSize() == sizeof(char)"},
+        {kEncodingExtension, 2, 3, "rec.UnitSize() == sizeof(char)"},
+    };
+    for (const auto& [subtype, unitSize, nUnits, condition] : rows) {
+        SysFileBuilder b(GetParam());
+        b.Numeric("A");
+        b.Numeric("B");
+        b.Extension(subtype, unitSize, Bytes(size_t(unitSize * nUnits), 1));
+        const OpenFailure f = FailureOf(b);
+        EXPECT_EQ(std::tie(f.number, f.condition), std::make_tuple(kErrBadFormat, condition));
+    }
+    // A frame without units, which the reader refuses before any handler sees it.
+    SystemFileDataSource source;
+    EXPECT_THROW(ImportExtension(kEncodingExtension, source, source.Settings(), {1, 0}),
+                 SystemFileException);
+}
