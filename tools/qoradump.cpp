@@ -224,6 +224,19 @@ std::vector<Variable> Variables(int handle) {
     return variables;
 }
 
+// Attribute lines of the file (varName null) or of a variable.
+void PrintAttributes(int handle, const char* varName, const char* indent) {
+    char** names = nullptr;
+    char** texts = nullptr;
+    int count = 0;
+    const int status = varName ? qoraGetVarAttributes(handle, varName, &names, &texts, &count)
+                               : qoraGetFileAttributes(handle, &names, &texts, &count);
+    if (Check(status, "reading the attributes") != 0) return;
+    for (int i = 0; i < count; ++i)
+        std::printf("%sattribute: %s = \"%s\"\n", indent, names[i], texts[i]);
+    qoraFreeAttributes(names, texts, count);
+}
+
 void PrintHeader(int handle, const std::vector<Variable>& variables) {
     int cases = 0, caseSize = 0;
     Check(qoraGetNumberofCases(handle, &cases), "counting the cases");
@@ -234,6 +247,7 @@ void PrintHeader(int handle, const std::vector<Variable>& variables) {
     else
         std::printf("Cases: %d\n", cases);
     std::printf("Case size: %d bytes\n", caseSize);
+    PrintAttributes(handle, nullptr, "");
 }
 
 // The getter for the print or the write format, and the format it reports.
@@ -329,6 +343,7 @@ void PrintVariable(int handle, int index, const Variable& var) {
     Check(qoraGetVarColumnWidth(handle, name, &columns), "reading the column width of " + var.name);
     std::printf("    measurement level %d, alignment %d, column width %d\n", level, alignment,
                 columns);
+    PrintAttributes(handle, name, "    ");
 }
 
 void PrintDictionary(int handle, const std::vector<Variable>& variables) {

@@ -32,7 +32,7 @@ Bytes RichFile(Endian endian, bool compressed) {
     b.FloatInfo();
     b.DateInfo({1, 2, 7, 1, 1, 2});
     b.DisplayParams(
-        {{1, 8, 1}, {2, 8, 1}, {3, 8, 1}, {1, 4, 0}, {1, 20, 0}, {1, 40, 0}, {3, 11, 1}});
+        {{1, 8, 1}, {2, 8, 1}, {3, 8, 1}, {1, 4, 0}, {1, 20, 0}, {1, 40, 0}, {1, 40, 0}, {3, 11, 1}});
     b.LongNames();
     b.VeryLongStrings();
     b.CaseCount64(3);
