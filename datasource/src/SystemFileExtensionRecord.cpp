@@ -29,6 +29,19 @@ void SystemFileExtensionRecord::SetContents(const void* data) {
     std::memcpy(Contents(), data, ByteCount());
 }
 
+std::string SystemFileExtensionRecord::Text() const {
+    if (!m_pContents) return std::string();
+    return std::string(reinterpret_cast<const char*>(m_pContents.get()), size_t(ByteCount()));
+}
+
+void SystemFileExtensionRecord::SetText(const std::string& text) {
+    if (text.empty()) return;
+    QORA_ASSERT(text.size() <= size_t(INT32_MAX));
+    SetUnitSize(1);
+    SetNUnits(int32_t(text.size()));
+    SetContents(text.data());
+}
+
 namespace {
 
 // Created by the first registration, at load; read-only afterwards.
@@ -69,8 +82,6 @@ void ImportExtension(int32_t subtype, QORA_DataSource& source, HeaderSettings& s
     if (SystemFileExtensionHandler* handler = FindExtensionHandler(subtype))
         handler->Import(source, settings, record);
     else if (!record.IsEmpty())
-        source.ImportExtension(
-            subtype, record.UnitSize(),
-            std::string(reinterpret_cast<const char*>(record.Contents()), record.ByteCount()));
+        source.ImportExtension(subtype, record.UnitSize(), record.Text());
     settings.NoteSeen(subtype);
 }

@@ -5,7 +5,12 @@
 #pragma once
 
 #include <cstdint>
+#include <cstring>
 #include <memory>
+#include <string>
+
+#include "byteorder.h"
+#include "dserror.h"
 
 class QORA_DataSource;
 struct HeaderSettings;
@@ -31,11 +36,40 @@ class SystemFileExtensionRecord {
     // Copies ByteCount() bytes.
     void SetContents(const void* data);
 
+    // Unit k as a number, reversed when the file is in the opposite byte
+    // order. Preconditions: units of sizeof(T), 0 <= k < NUnits().
+    template <class T>
+    T Unit(int32_t k, bool swapped) const;
+    // n numbers in the machine's order; none leaves the record empty.
+    template <class T>
+    void SetUnits(const T* values, int32_t n);
+    // The contents as bytes; empty when there are none.
+    std::string Text() const;
+    // Units of one byte; an empty text leaves the record empty.
+    void SetText(const std::string& text);
+
   private:
     std::unique_ptr<unsigned char[]> m_pContents;
     int32_t m_nUnits = 0;
     int32_t m_unitSize = 0;
 };
+
+template <class T>
+T SystemFileExtensionRecord::Unit(int32_t k, bool swapped) const {
+    QORA_ASSERT(m_unitSize == int32_t(sizeof(T)) && 0 <= k && k < m_nUnits);
+    T value;
+    std::memcpy(&value, m_pContents.get() + size_t(k) * sizeof(T), sizeof value);
+    if (swapped) SwapBytes(&value, sizeof value);
+    return value;
+}
+
+template <class T>
+void SystemFileExtensionRecord::SetUnits(const T* values, int32_t n) {
+    if (n == 0) return;
+    SetUnitSize(int32_t(sizeof(T)));
+    SetNUnits(n);
+    SetContents(values);
+}
 
 // Reads and writes one subtype. Handlers live in static storage and are
 // registered when the library is loaded.
