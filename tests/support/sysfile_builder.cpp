@@ -3,6 +3,7 @@
 #include <stdlib.h>
 
 #include <algorithm>
+#include <cctype>
 #include <cmath>
 #include <cstring>
 #include <filesystem>
@@ -250,6 +251,10 @@ void SysFileBuilder::WriteVar(Out& out, const Var& var) const {
         segments.assign(var.fWidth / kSegmentChars, kMaxShortString);
         if (var.fWidth % kSegmentChars) segments.push_back(var.fWidth % kSegmentChars);
     }
+    // Segments after the first are named, as a writer names them, from the
+    // first five bytes of the upper-case name the variable is known by.
+    std::string stem = (var.fLongName.empty() ? var.fName : var.fLongName).substr(0, 5);
+    for (char& c : stem) c = char(std::toupper(static_cast<unsigned char>(c)));
     for (size_t s = 0; s < segments.size(); ++s) {
         const int width = segments[s];
         const bool first = s == 0;
@@ -261,7 +266,7 @@ void SysFileBuilder::WriteVar(Out& out, const Var& var) const {
         out.I32(first ? var.fMissingCode : 0);
         out.I32(first && var.fPrint ? *var.fPrint : format);
         out.I32(first && var.fWrite ? *var.fWrite : format);
-        out.Text(first ? var.fName : var.fName.substr(0, 5) + std::to_string(s), 8);
+        out.Text(first ? var.fName : stem + std::to_string(s), 8);
         if (hasLabel) {
             const std::string& label = *var.fLabel;
             out.I32(var.fLabelLengthField.value_or(int32_t(label.size())));

@@ -1,0 +1,234 @@
+// The long names, very long strings and long value labels records: short
+// names, the bytes written and read back, files built byte by byte in every
+// form, and records that break the format.
+#include <gtest/gtest.h>
+
+#include <memory>
+#include <string>
+#include <tuple>
+#include <utility>
+#include <vector>
+
+#include "../qoramb/mbtest.h"
+#include "SFExtensionExtNames.h"
+#include "SystemFileExtensionRecord.h"
+#include "case_files.h"
+#include "memory_source.h"
+#include "reader_support.h"
+
+using namespace fixture;
+using namespace std::string_literals;
+
+namespace {
+
+std::string Export(int32_t subtype, QORA_DataSource& source, HeaderSettings& settings) {
+    SystemFileExtensionRecord record;
+    FindExtensionHandler(subtype)->Export(source, settings, record);
+    return record.Text();
+}
+
+void Import(int32_t subtype, QORA_DataSource& source, HeaderSettings& settings,
+            const std::string& text) {
+    SystemFileExtensionRecord record;
+    record.SetText(text);
+    FindExtensionHandler(subtype)->Import(source, settings, record);
+}
+
+// The contents of the only record of a builder without variables.
+std::string Contents(const SysFileBuilder& b) {
+    const fixture::Bytes file = b.Build();
+    return std::string(file.begin() + 176 + 16, file.end() - 8);
+}
+
+std::vector<std::string> ShortNames(const std::vector<std::string>& names) {
+    MemorySource source;
+    for (const std::string& name : names) source.Add(0, name.c_str());
+    HeaderSettings settings;
+    GenerateShortNames(source, settings);
+    std::vector<std::string> shortNames;
+    for (const auto& pair : settings.fNameList) shortNames.push_back(pair.second);
+    return shortNames;
+}
+
+// A value that fills the width, different at every position a segment may end.
+std::string Sample(int width) {
+    std::string text;
+    while (int(text.size()) < width) text += std::to_string(text.size()) + "|";
+    return text.substr(0, size_t(width));
+}
+
+class LongStringFiles : public ::testing::TestWithParam<DataForm> {};
+INSTANTIATE_TEST_SUITE_P(Forms, LongStringFiles, AllDataForms(), DataFormName);
+
+class LongStringRecords : public ByteOrders {};
+INSTANTIATE_TEST_SUITE_P(Orders, LongStringRecords,
+                         ::testing::Values(Endian::Native, Endian::Swapped), EndianName);
+
+}  // namespace
+
+TEST(ShortNames, KeysCutAtEightBytesElseNumberedByPosition) {
+    EncodingScope utf8(kUtf8);
+    EXPECT_EQ(ShortNames({"income_2004", "ab.cdefg_hij", "abcdefg._x", "bcdefgh\xC3\xA9z", "age",
+                          "x", "income_2004b"}),
+              (std::vector<std::string>{"INCOME_2", "AB.CDEFG", "ABCDEFG", "BCDEFGH", "AGE", "X",
+                                        "V7_A"}));
+    // V1_A to V1_Z are taken: the suffix goes on to AA.
+    std::vector<std::string> names{"v1_a____x"}, expected{"V1_AA"};
+    for (char c = 'A'; c <= 'Z'; ++c) {
+        names.push_back("v1_"s + char(c + 32));
+        expected.push_back("V1_"s + c);
+    }
+    EXPECT_EQ(ShortNames(names), expected);
+}
+
+// Exported as a writer does (21, 14, 13), then imported as a reader does
+// (13, 14, 21) into the dictionary the file holds.
+TEST(LongNamesRecords, ExportedBytesMatchTheFixtureAndReadBackWhole) {
+    MemorySource original;
+    original.Add(0, "age");
+    original.Add(0, "Income");
+    QORA_VLMap remarksLabels(600), notesLabels(20);
+    remarksLabels.Insert("none", -1, "Nothing said");
+    notesLabels.Insert("a", -1, "Alpha");
+    notesLabels.Insert("b", -1, std::string(300, 'L'));
+    original.GetVariable(original.Add(600, "Remarks")).SetValueLabels(remarksLabels);
+    original.GetVariable(2).SetLabel("Free text");
+    original.GetVariable(original.Add(20, "Notes")).SetValueLabels(notesLabels);
+    const std::string set = "things= Income Remarks\n";
+    original.SetExtensionContent(kVariableSetExtension, 1, int32_t(set.size()), set.data());
+
+    MemorySource written(original);
+    HeaderSettings out;
+    const std::string labels = Export(kLongValueLabelsExtension, written, out);
+    const std::string strings = Export(kVeryLongStringsExtension, written, out);
+    const std::string names = Export(kLongNamesExtension, written, out);
+
+    const std::string pad(19, ' ');
+    EXPECT_EQ(labels,
+              Contents(SysFileBuilder().LongValueLabelsRecord(
+                  {{"Remarks", 600, {{"none" + std::string(596, ' '), "Nothing said"}}},
+                   {"Notes", 20, {{"a" + pad, "Alpha"}, {"b" + pad, std::string(300, 'L')}}}})));
+    EXPECT_EQ(strings, std::string("REMARKS=600\0\t", 13));
+    EXPECT_EQ(
+        names,
+        Contents(SysFileBuilder().LongNames(
+            {{"AGE", "age"}, {"INCOME", "Income"}, {"REMARKS", "Remarks"}, {"NOTES", "Notes"}})));
+    std::vector<std::string> layout;
+    for (int i = 0; i < written.ColumnCount(); ++i) {
+        const QORA_Variable& var = written.GetVariable(i);
+        layout.push_back(var.GetName() + ":" + std::to_string(var.GetType()) + ":" +
+                         std::to_string(var.GetPrintFormat().width) +
+                         (var.GetValueLabels().IsValid() ? "+labels" : ""));
+    }
+    EXPECT_EQ(layout, (std::vector<std::string>{"AGE:0:8", "INCOME:0:8", "REMARKS:255:255",
+                                                "REMAR0:255:255", "REMAR1:96:96", "NOTES:20:20"}));
+    EXPECT_EQ(out.fVeryLongStrings, (std::vector<std::pair<int, int>>{{2, 600}}));
+    EXPECT_EQ(written.GetExtension(kVariableSetExtension).Impl()->Content(),
+              "things= INCOME REMARKS\n");
+
+    MemorySource read(written);
+    HeaderSettings in;
+    Import(kLongNamesExtension, read, in, names);
+    Import(kVeryLongStringsExtension, read, in, strings);
+    Import(kLongValueLabelsExtension, read, in, labels);
+    ASSERT_EQ(read.ColumnCount(), original.ColumnCount());
+    for (int i = 0; i < read.ColumnCount(); ++i)
+        EXPECT_TRUE(read.GetVariable(i) == original.GetVariable(i))
+            << read.GetVariable(i).GetName();
+    EXPECT_EQ(read.GetExtension(kVariableSetExtension).Impl()->Content(), set);
+}
+
+TEST_P(LongStringFiles, NamesWidthsLabelsAndValuesComeBackWhole) {
+    EncodingScope utf8(kUtf8);
+    SysFileBuilder b(std::get<0>(GetParam()));
+    b.Compressed(std::get<1>(GetParam()));
+    // M's long name has a two-byte character at bytes 64 and 65: it is cut before it.
+    const std::string mixed64 = "Name_" + std::string(58, 'x') + "Z", cut(63, 'm');
+    const std::vector<std::tuple<std::string, int, std::string>> vars{
+        {"N", 0, mixed64},           {"S256", 256, "Short256"},   {"S600", 600, "Remarks"},
+        {"M", 0, cut + "\xC3\xA9o"}, {"S2000", 2000, "LongText"}, {"L20", 20, "Label20"},
+        {"S32767", 32767, "Huge"}};
+    std::vector<Value> row;
+    for (const auto& [name, width, longName] : vars) {
+        (width ? b.String(name, width) : b.Numeric(name)).LongName(longName);
+        row.push_back(width ? Value(Sample(width)) : Value(0.5));
+    }
+    b.LongNames().VeryLongStrings().Case(row);
+    b.LongValueLabelsRecord(
+        {{"Label20", 20, {{"a", "Alpha"}}}, {"Remarks", 600, {{"none", "Nothing said"}}}});
+
+    auto source = OpenFixture(b.WriteTemp());
+    ASSERT_EQ(source->ColumnCount(), int(vars.size()));
+    std::unique_ptr<QORA_InputCaseIterator> it(source->NewIterator(nullptr));
+    ASSERT_TRUE(it->ReadCase());
+    for (int i = 0; i < source->ColumnCount(); ++i) {
+        const auto& [name, width, longName] = vars[size_t(i)];
+        EXPECT_EQ(source->GetVariable(i).GetName(), i == 3 ? cut : longName);
+        EXPECT_EQ(source->GetVariable(i).GetType(), width);
+        const double half = 0.5;
+        const std::string expected =
+            width ? Sample(width) : std::string(reinterpret_cast<const char*>(&half), 8);
+        EXPECT_EQ(std::string(static_cast<const char*>(it->ValuePointer(i)), expected.size()),
+                  expected)
+            << name;
+    }
+    EXPECT_EQ(*source->GetVariable(5).GetValueLabels().Lookup("a", -1), "Alpha");
+    EXPECT_EQ(*source->GetVariable(2).GetValueLabels().Lookup("none", -1), "Nothing said");
+}
+
+// Each file fails to open with the condition, or opens with the number of
+// variables (6 while both strings are in segments) and reads its case.
+TEST_P(LongStringRecords, MalformedAndIgnoredRecords) {
+    const std::string names = "S600=Remarks\tT300=Other";
+    const struct {
+        std::string names, strings;
+        std::string value, stray;  // of one long value labels entry for Remarks, if any
+        int32_t nameLength;        // written over the entry's, if not 0
+        const char* condition;
+        int columns;
+    } rows[] = {
+        {"A=alpha\tB", "", "", "", 0, "i != notFound && extString[i] == '='", 0},
+        {"A=al=pha", "", "", "", 0, "j == len || extString[j] == '\\t'", 0},
+        {names, "S600=600\0\tT300=300\0\t"s, "", "", 0, "", 3},
+        {"", "S600=600\0\t"s, "", "", 0, "", 6},
+        {names + "\tABCDEFGHIJKLMNO=Remarks", "ABCDEFGHIJKLMNO=600\0\t"s, "", "", 0, "", 4},
+        {names + "\tABCDEFGHIJKLMNOP=Remarks", "ABCDEFGHIJKLMNOP=600\0\t"s, "", "", 0, "", 6},
+        {names, "S600=100600\0\tT300=300\0\t"s, "", "", 0, "", 6},
+        {names, "S600=700\0\tT300=300\0\t"s, "", "", 0, "", 5},
+        {names, "T300=0\0\tS600=100\0\t"s, "", "", 0, "", 6},
+        // R1 names the last two segments of Remarks as a string of width 348.
+        {names + "\tR1=REMAR1", "S600=600\0\tR1=348\0\t"s, "", "", 0, "", 4},
+        {names, "", "none", "", 0, "", 6},  // Remarks is still in segments: skipped
+        {names, "", "none", "0123456789", 0, "r+13 < endr", 0},
+        {names, "", std::string(601, 'v'), "", 0, "valLen <= varType", 0},
+        {names, "", "none", "", -7, "nameLength >= 0", 0},
+    };
+    for (const auto& row : rows) {
+        SysFileBuilder b(GetParam());
+        b.String("S600", 600).LongName("Remarks");
+        b.String("T300", 300).LongName("Other");
+        b.Numeric("N");
+        b.Case({Sample(600), Sample(300), 1.0});
+        if (!row.names.empty()) b.TextExtension(13, row.names);
+        if (!row.strings.empty()) b.TextExtension(14, row.strings);
+        if (!row.value.empty()) {
+            std::string entry =
+                Contents(SysFileBuilder(GetParam())
+                             .LongValueLabelsRecord({{"Remarks", 600, {{row.value, "Nil"}}}})) +
+                row.stray;
+            const fixture::Bytes nameLength = b.Int32(row.nameLength);
+            if (row.nameLength != 0)
+                entry.replace(entry.begin(), entry.begin() + 4, nameLength.begin(),
+                              nameLength.end());
+            b.Extension(21, 1, fixture::Bytes(entry.begin(), entry.end()));
+        }
+        const std::string path = b.WriteTemp();
+        const OpenFailure f = FailureOf(path);
+        EXPECT_EQ(f.condition, row.condition) << row.names << " " << f.text;
+        if (f.number != 0) continue;
+        auto source = OpenFixture(path);
+        EXPECT_EQ(source->ColumnCount(), row.columns) << row.names << " " << row.strings;
+        std::unique_ptr<QORA_InputCaseIterator> it(source->NewIterator(nullptr));
+        EXPECT_TRUE(it->ReadCase());
+    }
+}
