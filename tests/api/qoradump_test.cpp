@@ -33,21 +33,17 @@ DumpResult Dump(const std::string& arguments) {
 
 const std::string kSample = QORA_EXAMPLES_DIR "/sample.qsf";
 
-// The names as the file's long names give them, or lower-cased where the
-// long names are not applied; either is right for these tests.
-std::string Folded(std::string text) {
-    for (char& c : text) c = char(std::tolower(static_cast<unsigned char>(c)));
-    return text;
-}
-
 TEST(QoraDump, CasesAreCsvWithQuotingTrimmingAndEmptyMissing) {
     const DumpResult run = Dump("--cases " + kSample);
     ASSERT_EQ(run.exitCode, 0) << run.output;
-    EXPECT_EQ(Folded(run.output.substr(0, run.output.find('\n'))), "id,sex,score,city,remark,born");
-    EXPECT_NE(run.output.find("\n1,1,87.5,LDN,friendly,1970-01-01\n"), std::string::npos);
+    EXPECT_EQ(run.output.substr(0, run.output.find('\n')),
+              "Id,Sex,Score,City,Remark,Born,CountryOfBirth,InterviewerComments");
+    EXPECT_NE(run.output.find("\n1,1,87.5,LDN,friendly,1970-01-01,United Kingdom," +
+                              std::string(279, '-') + " end of a long remark\n"),
+              std::string::npos);
     EXPECT_NE(run.output.find("\n2,2,92,PAR,\"said \"\"no comment\"\"\","), std::string::npos);
-    EXPECT_NE(run.output.find("\n3,9,-5,NONE,,\n"), std::string::npos);
-    EXPECT_NE(run.output.find("\n6,,70,PAR,,1582-10-14\n"), std::string::npos);  // date 0
+    EXPECT_NE(run.output.find("\n3,9,-5,NONE,,,,\n"), std::string::npos);
+    EXPECT_NE(run.output.find("\n6,,70,PAR,,1582-10-14,,\n"), std::string::npos);  // date 0
     EXPECT_NE(run.output.find("\n4,1,,LDN,\"late, then left early\","), std::string::npos);
     EXPECT_NE(run.output.find("\n5,2,64.25,ROM,  leading blanks kept,"), std::string::npos);
     EXPECT_EQ(std::count(run.output.begin(), run.output.end(), '\n'), 13);
@@ -56,10 +52,10 @@ TEST(QoraDump, CasesAreCsvWithQuotingTrimmingAndEmptyMissing) {
 TEST(QoraDump, RangeSeeksToTheFirstCaseAndStopsAfterTheLast) {
     const DumpResult run = Dump("--cases --from 11 --to 12 " + kSample);
     ASSERT_EQ(run.exitCode, 0) << run.output;
-    EXPECT_EQ(Folded(run.output),
-              "id,sex,score,city,remark,born\n"
-              "11,1,-1,none,refused the test,1968-05-01\n"
-              "12,2,79,par,the last one,2010-01-02\n");
+    EXPECT_EQ(run.output,
+              "Id,Sex,Score,City,Remark,Born,CountryOfBirth,InterviewerComments\n"
+              "11,1,-1,NONE,refused the test,1968-05-01,,\n"
+              "12,2,79,PAR,the last one,2010-01-02,,\n");
 
     const DumpResult past = Dump("--cases --from 20 " + kSample);
     EXPECT_EQ(past.exitCode, 0) << past.output;
@@ -69,16 +65,21 @@ TEST(QoraDump, RangeSeeksToTheFirstCaseAndStopsAfterTheLast) {
 TEST(QoraDump, DictionaryShowsEveryProperty) {
     const DumpResult run = Dump("--dict " + kSample);
     ASSERT_EQ(run.exitCode, 0) << run.output;
-    const std::string output = Folded(run.output);
+    const std::string& output = run.output;
     for (const char* line :
-         {"Variables: 6\n", "Cases: 12\n", "Case size: 72 bytes\n", "2. sex (numeric)\n",
+         {"Variables: 8\n", "Cases: 12\n", "Case size: 400 bytes\n",
+          "attribute: Source = \"fixture builder\"\n", "2. Sex (numeric)\n",
           "    label: Sex of respondent\n", "    missing values: 9\n",
           "    value label: 2 = \"Female\"\n", "    missing values: -99 thru -1\n",
-          "4. city (string, 6 bytes)\n", "    missing values: \"NONE\"\n",
+          "4. City (string, 6 bytes)\n", "    missing values: \"NONE\"\n",
           "    value label: \"LDN\" = \"London\"\n",
-          "    print format: code 20, width 11, 0 decimals\n", "    measurement level "})
-        EXPECT_NE(output.find(Folded(line)), std::string::npos) << line;
-    EXPECT_EQ(output.find("id,sex"), std::string::npos);
+          "    print format: code 20, width 11, 0 decimals\n",
+          "    measurement level 3, alignment 1, column width 8\n",
+          "    attribute: Unit = \"points\"\n", "7. CountryOfBirth (string, 20 bytes)\n",
+          "    value label: \"France\" = \"Born in France\"\n",
+          "8. InterviewerComments (string, 300 bytes)\n"})
+        EXPECT_NE(output.find(line), std::string::npos) << line;
+    EXPECT_EQ(output.find("Id,Sex"), std::string::npos);
 }
 
 TEST(QoraDump, ErrorsNameTheStatusAndExitNonZero) {
