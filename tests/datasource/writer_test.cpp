@@ -12,6 +12,7 @@
 
 #include "SaveDS.h"
 #include "api_handles.h"
+#include "case.h"
 #include "reader_support.h"
 
 using namespace fixture;
@@ -54,24 +55,6 @@ QORA_Variable& Add(QORA_DataSource& source, const char* name, int type) {
     var.SetPrintFormatWord(format);
     var.SetWriteFormatWord(format);
     return var;
-}
-
-// One case in the source's layout: numbers and blank-padded strings.
-std::vector<double> Units(const QORA_DataSource& source, const std::vector<Value>& row) {
-    std::vector<double> units(size_t(source.ValueCount()));
-    auto* bytes = reinterpret_cast<char*>(units.data());
-    for (int i = 0; i < source.ColumnCount(); ++i) {
-        char* unit = bytes + 8 * source.ValueOffset(i);
-        const Value& value = row[size_t(i)];
-        if (value.IsString()) {
-            std::memset(unit, ' ', 8 * size_t(source.GetVariable(i).ValueUnits()));
-            std::memcpy(unit, value.Text().data(), value.Text().size());
-        } else {
-            const double number = value.Number();
-            std::memcpy(unit, &number, 8);
-        }
-    }
-    return units;
 }
 
 struct WriterCase {
@@ -169,7 +152,15 @@ TEST_P(WriterBytes, MatchTheBuilderRecordForRecord) {
         c.define(source, b);
         source.CommitDictionary();
         for (const auto& row : c.cases) {
-            source.WriteCase(Units(source, row).data());
+            QORA_Case units(source);
+            for (int i = 0; i < source.ColumnCount(); ++i) {
+                const Value& value = row[size_t(i)];
+                if (value.IsString())
+                    units.SetString(i, value.Text().c_str());
+                else
+                    units.SetNumeric(i, value.Number());
+            }
+            source.WriteCase(units.Buffer());
             b.Case(row);
         }
         source.FinishWriting();
