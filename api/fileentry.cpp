@@ -15,9 +15,15 @@ FileEntry::FileEntry(std::unique_ptr<QORA_DataSource> dataSource, OpenMode mode)
     if (fCommitted && fpDataSource) BuildValueSlots();
 }
 
-// The writer's finishing operation, for write and append entries with a
-// system file view, joins here with the writer.
-FileEntry::~FileEntry() = default;
+// A file being written is completed on disk before anything else goes.
+FileEntry::~FileEntry() {
+    if (fpSystemFile == nullptr || fMode == ReadMode) return;
+    try {
+        fpSystemFile->FinishWriting();
+    } catch (...) {
+        // The writer has done what it could; the slot is freed regardless.
+    }
+}
 
 SystemFileDataSource* FileEntry::SystemFileOrParent() const {
     if (fpSystemFile || !fpDataSource) return fpSystemFile;

@@ -14,6 +14,7 @@
 enum CatchAll : int {
     kCatchCaseOut = QORA_STATUS_WRITE_FAILED,
     kCatchCaseIn = QORA_STATUS_READ_FAILED,
+    kCatchCopy = QORA_STATUS_READ_FAILED,
     kCatchOpen = QORA_STATUS_BAD_FILE,
     kCatchFree = QORA_STATUS_CANNOT_FREE,
     kCatchHandle = QORA_STATUS_BAD_FILE_HANDLE,

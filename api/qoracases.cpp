@@ -1,7 +1,10 @@
 // The case data calls: reading cases, positioning the reader, single values
 // of the current case, and the special values of the numeric model.
+#include <algorithm>
 #include <cstring>
+#include <new>
 
+#include "SystemFileDataSource.h"
 #include "case.h"
 #include "qoracall.h"
 #include "specialvalues.h"
@@ -20,8 +23,45 @@ int ResolveVariable(const FileEntry& entry, double varHandle, const ValueSlot** 
     return QORA_STATUS_OK;
 }
 
-const char* ValueAt(const FileEntry& entry, const ValueSlot& slot) {
-    return reinterpret_cast<const char*>(entry.fpCaseBuffer.get()) + size_t(slot.offset) * 8;
+char* ValueAt(const FileEntry& entry, const ValueSlot& slot) {
+    return reinterpret_cast<char*>(entry.fpCaseBuffer.get()) + size_t(slot.offset) * 8;
+}
+
+// Makes sure a case is under construction: the first value of a case starts
+// from the blank case, made once per entry.
+int PrepareCaseOutput(FileEntry& entry) {
+    const size_t bytes = 8 * size_t(entry.fpDataSource->ValueCount());
+    if (!entry.fpCaseBuffer) {
+        const size_t units = std::max<size_t>(bytes / 8, 1);
+        entry.fpCaseBuffer.reset(new (std::nothrow) double[units]);
+        entry.fpBlankCase.reset(new (std::nothrow) double[units]);
+        if (!entry.fpCaseBuffer || !entry.fpBlankCase) {
+            entry.fpCaseBuffer.reset();
+            return QORA_STATUS_NO_MEMORY;
+        }
+        entry.fpDataSource->ClearValues(entry.fpBlankCase.get(), 0,
+                                        entry.fpDataSource->ColumnCount());
+        entry.fCaseState = CaseNone;
+    }
+    if (entry.fCaseState != CaseLoaded) {
+        std::memcpy(entry.fpCaseBuffer.get(), entry.fpBlankCase.get(), bytes);
+        entry.fCaseState = CaseLoaded;
+    }
+    return QORA_STATUS_OK;
+}
+
+// Prepares the case and resolves the variable: the value's place, or a status.
+int OutputSlot(FileEntry& entry, double varHandle, const ValueSlot** slot) {
+    if (const int status = PrepareCaseOutput(entry)) return status;
+    return ResolveVariable(entry, varHandle, slot);
+}
+
+// Hands a whole case in the file's layout to the data source.
+int WriteWholeCase(FileEntry& entry, const void* units) {
+    if (units == nullptr || !entry.HasSystemFile()) return QORA_STATUS_WRITE_FAILED;
+    entry.fpSystemFile->WriteCase(units);
+    entry.fCaseState = CaseNone;
+    return QORA_STATUS_OK;
 }
 
 // Reads the next case into the case buffer, or straight into a whole case
@@ -95,6 +135,45 @@ int QORA_API qoraGetValueChar(int handle, double varHandle, char* value, int val
         value[slot->width] = '\0';
         return int(QORA_STATUS_OK);
     });
+}
+
+int QORA_API qoraSetValueNumeric(int handle, double varHandle, double value) {
+    return EntryCall(handle, AccessWriteCases, kCatchCaseOut, [&](FileEntry& entry) -> int {
+        const ValueSlot* slot;
+        if (const int status = OutputSlot(entry, varHandle, &slot)) return status;
+        if (slot->width != 0) return QORA_STATUS_NUMERIC_REQUIRED;
+        std::memcpy(ValueAt(entry, *slot), &value, sizeof value);
+        return QORA_STATUS_OK;
+    });
+}
+
+int QORA_API qoraSetValueChar(int handle, double varHandle, const char* value) {
+    return EntryCall(handle, AccessWriteCases, kCatchCaseOut, [&](FileEntry& entry) -> int {
+        const ValueSlot* slot;
+        if (const int status = OutputSlot(entry, varHandle, &slot)) return status;
+        if (slot->width == 0) return QORA_STATUS_STRING_REQUIRED;
+        if (value == nullptr) return QORA_STATUS_WRITE_FAILED;
+        const size_t length = std::strlen(value);
+        if (length > size_t(slot->width)) return QORA_STATUS_STRING_TOO_LONG;
+        char* out = ValueAt(entry, *slot);
+        std::memcpy(out, value, length);
+        std::memset(out + length, ' ', size_t(slot->width) - length);
+        return QORA_STATUS_OK;
+    });
+}
+
+// A case on which no value was set is written as the blank case.
+int QORA_API qoraCommitCaseRecord(int handle) {
+    return EntryCall(handle, AccessWriteCases, kCatchCaseOut, [](FileEntry& entry) -> int {
+        if (const int status = PrepareCaseOutput(entry)) return status;
+        return WriteWholeCase(entry, entry.fpCaseBuffer.get());
+    });
+}
+
+// A case being built value by value is dropped.
+int QORA_API qoraWholeCaseOut(int handle, const void* caseRecord) {
+    return EntryCall(handle, AccessWriteCases, kCatchCaseOut,
+                     [&](FileEntry& entry) { return WriteWholeCase(entry, caseRecord); });
 }
 
 double QORA_API qoraSysmisVal(void) { return SysmisValue(); }

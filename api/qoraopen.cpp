@@ -32,6 +32,46 @@ int AllocateSlot(OpenMode mode, const char* fileName, int* handle) {
     return TheHandleTable().Insert(std::move(entry), handle);
 }
 
+// Allocates a slot and readies it with prepare(slot): 0 with *handle set,
+// else the status, with the slot closed again.
+template <typename Prepare>
+int OpenSlot(OpenMode mode, const char* fileName, int* handle, Prepare prepare) {
+    int slot;
+    if (const int status = AllocateSlot(mode, fileName, &slot)) return status;
+    if (const int status = prepare(slot)) {
+        TheHandleTable().Close(slot);
+        return status;
+    }
+    *handle = slot;
+    return QORA_STATUS_OK;
+}
+
+// Closes a handle at the end of the scope unless it was handed out.
+class SlotGuard {
+  public:
+    SlotGuard() = default;
+    SlotGuard(const SlotGuard&) = delete;
+    SlotGuard& operator=(const SlotGuard&) = delete;
+    ~SlotGuard() {
+        if (fHandle >= 0) TheHandleTable().Close(fHandle);
+    }
+    int* out() { return &fHandle; }
+    FileEntry& Entry(Access access) const {
+        FileEntry* entry = nullptr;
+        TheHandleTable().Lookup(fHandle, access, &entry);
+        QORA_ASSERT(entry != nullptr);
+        return *entry;
+    }
+    int Release() {
+        const int handle = fHandle;
+        fHandle = -1;
+        return handle;
+    }
+
+  private:
+    int fHandle = -1;
+};
+
 // What a read entry needs beyond its data source: the name index, the case
 // buffer and the case reader over it.
 int PrepareForReading(int handle) {
@@ -69,14 +109,7 @@ int QORA_API qoraOpenRead(const char* fileName, int* handle) {
     *handle = -1;
     return GuardedCall(kCatchOpen, [&]() -> int {
         if (fileName == nullptr) return QORA_STATUS_BAD_FILE;
-        int slot;
-        if (const int status = AllocateSlot(ReadMode, fileName, &slot)) return status;
-        if (const int status = PrepareForReading(slot)) {
-            TheHandleTable().Close(slot);
-            return status;
-        }
-        *handle = slot;
-        return QORA_STATUS_OK;
+        return OpenSlot(ReadMode, fileName, handle, PrepareForReading);
     });
 }
 
@@ -98,6 +131,42 @@ int QORA_API qoraOpenWrite(const char* fileName, int* handle) {
         }
         *handle = slot;
         return QORA_STATUS_OK;
+    });
+}
+
+// The temporary read handle and, on failure, the new write handle are closed
+// whatever happens, an exception included. Nothing was written at fileName,
+// so nothing there is removed.
+int QORA_API qoraOpenWriteCopy(const char* fileName, const char* dictFileName, int* handle) {
+    if (handle == nullptr) return kCatchCopy;
+    *handle = -1;
+    return GuardedCall(kCatchCopy, [&]() -> int {
+        if (AccessProbe(dictFileName, kProbeRead) != QORA_STATUS_OK) return QORA_STATUS_CANNOT_OPEN;
+        SlotGuard dictionary;
+        if (const int status = AllocateSlot(ReadMode, dictFileName, dictionary.out()))
+            return status;
+        const FileEntry& source = dictionary.Entry(AccessAny);
+        if (AccessProbe(fileName, kProbeWrite) != QORA_STATUS_OK) return QORA_STATUS_CANNOT_OPEN;
+        SlotGuard copy;
+        if (const int status = AllocateSlot(WriteMode, fileName, copy.out())) return status;
+        FileEntry& target = copy.Entry(AccessDefine);
+        target.fpDataSource->AssignFrom(*source.fpDataSource);
+        target.fpDataSource->SetFileName(fileName);
+        if (const int status = target.BuildNameIndex()) return status;
+        *handle = copy.Release();
+        return QORA_STATUS_OK;
+    });
+}
+
+int QORA_API qoraOpenAppend(const char* fileName, int* handle) {
+    if (handle == nullptr) return kCatchOpen;
+    *handle = -1;
+    return GuardedCall(kCatchOpen, [&]() -> int {
+        if (AccessProbe(fileName, kProbeAppend) != QORA_STATUS_OK) return QORA_STATUS_CANNOT_OPEN;
+        return OpenSlot(AppendMode, fileName, handle, [](int slot) {
+            return EntryCall(slot, AccessAny, kCatchOpen,
+                             [](FileEntry& entry) { return entry.BuildNameIndex(); });
+        });
     });
 }
 

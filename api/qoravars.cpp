@@ -5,13 +5,14 @@
 #include <cstring>
 #include <string>
 
+#include "SystemFileDataSource.h"
 #include "namerules.h"
 #include "qoracall.h"
 #include "qoramb.h"
 
 namespace {
 
-enum { kMaxLabelBytes = 256, kShortLabelBuffer = 121, kMaxShortString = 8 };
+enum { kMaxLabelBytes = 256, kShortLabelBuffer = 121, kMaxShortString = 8, kShortNameBytes = 8 };
 
 // The name rules on a name with its surrounding blanks dropped (trailing
 // blanks are not counted by the rules themselves).
@@ -29,6 +30,17 @@ void FreeNames(char** names, int* types, int count) {
     if (count <= 0) return;
     FreeCallerStrings(names, count);
     std::free(types);
+}
+
+// The short name paired with a variable's name in the file's name list: a
+// file being written pairs (name, short name), a file read (short, long).
+const std::string* PairedShortName(const HeaderSettings& settings, const std::string& name,
+                                   bool writing) {
+    for (const auto& [first, second] : settings.fNameList) {
+        if (writing && first == name) return &second;
+        if (!writing && second == name) return &first;
+    }
+    return nullptr;
 }
 
 }  // namespace
@@ -112,6 +124,26 @@ int QORA_API qoraGetVarNames(int handle, int* count, char*** names, int** types)
 int QORA_API qoraFreeVarNames(char** names, int* types, int count) {
     return GuardedCall(kCatchFree, [&] {
         FreeNames(names, types, count);
+        return QORA_STATUS_OK;
+    });
+}
+
+// Without a paired short name, the first 8 bytes of the name stand in.
+int QORA_API qoraGetVarCompatName(int handle, const char* name, char* shortName) {
+    if (shortName == nullptr) return kCatchHandle;
+    shortName[0] = '\0';
+    return EntryCall(handle, AccessAny, kCatchHandle, [&](FileEntry& entry) -> int {
+        const int index = entry.FindVariable(name);
+        if (!entry.HasSystemFile()) return QORA_STATUS_NO_SYSTEM_FILE;
+        if (!entry.fCommitted) return QORA_STATUS_DICT_NOT_COMMITTED;
+        if (index < 0) return QORA_STATUS_VAR_NOT_FOUND;
+        const std::string& varName = entry.fpDataSource->GetVariable(index).GetName();
+        const std::string* paired =
+            PairedShortName(entry.fpSystemFile->Settings(), varName, entry.fMode == WriteMode);
+        const std::string& chosen =
+            paired && !paired->empty() && paired->size() <= kShortNameBytes ? *paired : varName;
+        std::memset(shortName, 0, kShortNameBytes + 1);
+        std::memcpy(shortName, chosen.data(), std::min(chosen.size(), size_t(kShortNameBytes)));
         return QORA_STATUS_OK;
     });
 }

@@ -19,8 +19,14 @@ class CompressedSystemFile;
 class IndependentDataStore : public QORA_DataSource {
   public:
     using QORA_DataSource::QORA_DataSource;
+    // One case in the dictionary's layout (ValueCount() units).
+    virtual void WriteCase(const void* units) = 0;
+    // Completes the file on disk; nothing when no cases are being written.
+    virtual void FinishWriting() = 0;
     // Takes effect when the dictionary is written.
     virtual void SetCompression(bool on) = 0;
+    // Writes the dictionary; cases may follow.
+    virtual void CommitDictionary() = 0;
 };
 
 // Receives the warnings of the opening factory.
@@ -34,6 +40,7 @@ class SystemFileDataSource : public IndependentDataStore {
   public:
     enum State { kNothingYet = 0, kWriting = 1, kReading = 2 };
     class Iterator;
+    class SaveDS;
 
     // An empty source for a file that is to be written.
     SystemFileDataSource();
@@ -42,12 +49,23 @@ class SystemFileDataSource : public IndependentDataStore {
     // malformed one 1204 or 1205; the error carries the file name and nests
     // the SystemFileException with the failed condition.
     explicit SystemFileDataSource(const char* fileName);
+    // Finishes a file whose cases are being written.
     ~SystemFileDataSource() override;
 
     // A reader of the cases with a stream of its own.
     QORA_InputCaseIterator* NewIterator(void* buffer) override;
     int64_t CaseCount() const override { return fSettings.fCaseCount; }
     void SetCompression(bool on) override { fSettings.fCompressed = on; }
+
+    // Writing. The file named by GetFileName() is created when the
+    // dictionary is committed (internal error 1209 when anything was read or
+    // written before). Writing cases to a source that was read appends them
+    // to its file; writing them while a case iterator exists is refused
+    // (1209). A SystemFileException comes out as an internal error with the
+    // same number and the file name, nesting the original.
+    void CommitDictionary() override;
+    void WriteCase(const void* units) override;
+    void FinishWriting() override;
 
     // What the file said.
     // Whether a type 7 record of the subtype was read (subtype 0: documents).
@@ -73,6 +91,7 @@ class SystemFileDataSource : public IndependentDataStore {
   private:
     // Header, dictionary records and the repairs, up to the case data.
     void Read();
+    void StartAppending();
 
     State fState = kNothingYet;
     HeaderSettings fSettings;
@@ -81,6 +100,7 @@ class SystemFileDataSource : public IndependentDataStore {
     int64_t fCaseCountRecordPos = 0;
     SparseFileIndex fIndex;
     int32_t fLiveIterators = 0;
+    std::unique_ptr<SaveDS> fpWriter;  // while cases are written
 };
 
 // Reads the cases of a system file: positions by arithmetic when the data
