@@ -5,6 +5,7 @@
 
 #include "DictionaryReader.h"
 #include "ReaderRepairs.h"
+#include "SFExtensionEncoding.h"
 #include "SaveDS.h"
 
 namespace {
@@ -70,6 +71,7 @@ bool SystemFileDataSource::GetReleaseInfo(int* major, int* minor, int* revision)
 // alone.
 void SystemFileDataSource::CommitDictionary() {
     if (fState != kNothingYet) RaiseError(kErrWriteWhileReading);
+    SetCharacterCodeFromEncoding(fSettings);
     NamingFailures(GetFileName(), [this] {
         auto writer = std::make_unique<SaveDS>(*this, fStream, fSettings);
         writer->PrepareDictionary();
