@@ -19,12 +19,11 @@
 #include <string>
 #include <vector>
 
+#include "bench_files.h"
 #include "qoraio32.h"
 
 namespace {
 
-constexpr int kVariables = 100;
-constexpr int64_t kCases = 262144;  // 100 numbers of 8 bytes: 200 MiB of case data
 constexpr uint64_t kSysmisBits = 0xFFEFFFFFFFFFFFFFull;
 
 class Writer {
@@ -68,15 +67,6 @@ void WriteDictionary(Writer& out, bool compressed) {
     out.I32(999);
     out.I32(0);
 }
-
-// A cheap, fixed sequence of pseudo-random numbers.
-struct Random {
-    uint64_t state = 0x9E3779B97F4A7C15ull;
-    uint32_t Next() {
-        state = state * 6364136223846793005ull + 1442695040888963407ull;
-        return uint32_t(state >> 33);
-    }
-};
 
 // Raw value units: measurements with fractions.
 void WriteRawCases(Writer& out) {
@@ -123,8 +113,6 @@ std::string WriteFile(const std::string& dir, bool compressed) {
 const std::string& PathOf(const benchmark::State& state) {
     return state.range(0) ? gCompressedPath : gRawPath;
 }
-
-constexpr int64_t kCaseBytes = kCases * kVariables * 8;
 
 void ReadBaseline(benchmark::State& state) {
     const std::string& path = PathOf(state);
@@ -199,6 +187,7 @@ int main(int argc, char** argv) {
     char dirTemplate[] = "/tmp/qora-bench-XXXXXX";
     if (!mkdtemp(dirTemplate)) return 1;
     const std::string dir = dirTemplate;
+    gBenchDirectory = dir;
     int result = 0;
     try {
         gRawPath = WriteFile(dir, false);
