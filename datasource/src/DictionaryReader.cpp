@@ -17,15 +17,7 @@ namespace {
 
 using int32 = int32_t;
 
-enum : int32 {
-    kVariableRecord = 2,
-    kValueLabelRecord = 3,
-    kValueLabelVarsRecord = 4,
-    kDocumentRecord = 6,
-    kExtensionRecord = 7,
-    kEndRecord = 999
-};
-enum { kDocumentLineSize = 80, kMaxFileVarType = 255, kStringValueSize = 8 };
+enum { kMaxFileVarType = 255, kStringValueSize = 8 };
 
 // The fixed part of a type 2 record, after its record type.
 struct VariableRecord {

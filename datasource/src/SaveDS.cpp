@@ -17,18 +17,9 @@
 
 namespace {
 
-enum : int32_t {
-    kVariableRecord = 2,
-    kValueLabelRecord = 3,
-    kValueLabelVarsRecord = 4,
-    kDocumentRecord = 6,
-    kExtensionRecord = 7,
-    kEndRecord = 999,
-};
 enum : size_t {
     kUnit = 8,
     kNameSize = 8,
-    kDocumentLineSize = 80,
     kMaxValueLabel = 255,
     kSegmentBytes = 256,
     kSegmentText = 255,

@@ -53,3 +53,15 @@ struct SystemFileHeader {
     // with blanks (a NUL ends it early).
     void Encode(unsigned char* bytes) const;
 };
+
+// The dictionary records that follow the header, by the type that opens each.
+enum DictionaryRecordType : int32_t {
+    kVariableRecord = 2,
+    kValueLabelRecord = 3,
+    kValueLabelVarsRecord = 4,  // follows each value label record
+    kDocumentRecord = 6,
+    kExtensionRecord = 7,
+    kEndRecord = 999,
+};
+// Document text is kept in lines of this many bytes.
+enum : size_t { kDocumentLineSize = 80 };
