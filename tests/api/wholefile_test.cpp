@@ -21,6 +21,8 @@ using fixture::OpenHandle;
 using fixture::SysFileBuilder;
 
 const std::string kLongName = "RespondentNumber_" + std::string(46, 'x') + "Z";  // 64 bytes
+// A long name whose two-byte character would end at byte 65 is cut before it.
+const std::string kCutName(63, 'm');
 
 struct Text {
     const char* shortName;
@@ -48,8 +50,10 @@ TEST_P(WholeFile, EveryRecordReadsBackThroughTheCalls) {
     SysFileBuilder b(std::get<0>(GetParam()));
     b.Compressed(std::get<1>(GetParam()));
     b.header().caseCount = -1;
+    fixture::Utf8Mode utf8;
     b.Numeric("RESPONDE").LongName(kLongName);
-    std::vector<std::array<int32_t, 3>> display{{1, 12, 1}};
+    b.Numeric("M").LongName(kCutName + "\xC3\xA9o");
+    std::vector<std::array<int32_t, 3>> display{{1, 12, 1}, {1, 12, 1}};
     for (const Text& t : kTexts) {
         b.String(t.shortName, t.width).LongName(t.longName);
         const int segments = t.width <= 255 ? 1 : (t.width + 251) / 252;
@@ -64,7 +68,7 @@ TEST_P(WholeFile, EveryRecordReadsBackThroughTheCalls) {
     b.LongValueLabelsRecord({{"Labelled20", 20, {{"alpha", "First"}, {"beta", "Second"}}},
                              {"Labelled600", 600, {{"x", std::string(300, 'L')}}}});
     for (int row = 0; row < 3; ++row) {
-        std::vector<fixture::Value> values{double(row + 1)};
+        std::vector<fixture::Value> values{double(row + 1), 0.0};
         for (const Text& t : kTexts) values.emplace_back(Filled(t.width, row));
         b.Case(values);
     }
@@ -75,13 +79,15 @@ TEST_P(WholeFile, EveryRecordReadsBackThroughTheCalls) {
     ASSERT_EQ(qoraGetNumberofCases(h.get(), &count), QORA_STATUS_OK);
     EXPECT_EQ(count, 3);
     ASSERT_EQ(qoraGetNumberofVariables(h.get(), &count), QORA_STATUS_OK);
-    ASSERT_EQ(count, 7);
+    ASSERT_EQ(count, 8);
     char name[65];
     int type = -1;
     ASSERT_EQ(qoraGetVarInfo(h.get(), 0, name, &type), QORA_STATUS_OK);
     EXPECT_EQ(name, kLongName);
+    ASSERT_EQ(qoraGetVarInfo(h.get(), 1, name, &type), QORA_STATUS_OK);
+    EXPECT_EQ(name, kCutName);
     for (int i = 0; i < 6; ++i) {
-        ASSERT_EQ(qoraGetVarInfo(h.get(), i + 1, name, &type), QORA_STATUS_OK);
+        ASSERT_EQ(qoraGetVarInfo(h.get(), i + 2, name, &type), QORA_STATUS_OK);
         EXPECT_EQ(std::string(name) + "/" + std::to_string(type),
                   std::string(kTexts[i].longName) + "/" + std::to_string(kTexts[i].width));
         int level = 0, width = 0, alignment = -1;
@@ -116,7 +122,7 @@ TEST_P(WholeFile, EveryRecordReadsBackThroughTheCalls) {
         ASSERT_EQ(qoraGetValueNumeric(h.get(), 1.0, &number), QORA_STATUS_OK);
         EXPECT_EQ(number, row + 1);
         for (int i = 0; i < 6; ++i) {
-            ASSERT_EQ(qoraGetValueChar(h.get(), i + 2.0, buffer.data(), int(buffer.size())),
+            ASSERT_EQ(qoraGetValueChar(h.get(), i + 3.0, buffer.data(), int(buffer.size())),
                       QORA_STATUS_OK);
             EXPECT_EQ(buffer.data(), Filled(kTexts[i].width, row)) << kTexts[i].longName;
         }

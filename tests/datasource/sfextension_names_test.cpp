@@ -57,9 +57,6 @@ std::string Sample(int width) {
     return text.substr(0, size_t(width));
 }
 
-class LongStringFiles : public ::testing::TestWithParam<DataForm> {};
-INSTANTIATE_TEST_SUITE_P(Forms, LongStringFiles, AllDataForms(), DataFormName);
-
 class LongStringRecords : public ByteOrders {};
 INSTANTIATE_TEST_SUITE_P(Orders, LongStringRecords,
                          ::testing::Values(Endian::Native, Endian::Swapped), EndianName);
@@ -136,44 +133,6 @@ TEST(LongNamesRecords, ExportedBytesMatchTheFixtureAndReadBackWhole) {
         EXPECT_TRUE(read.GetVariable(i) == original.GetVariable(i))
             << read.GetVariable(i).GetName();
     EXPECT_EQ(read.GetExtension(kVariableSetExtension).Impl()->Content(), set);
-}
-
-TEST_P(LongStringFiles, NamesWidthsLabelsAndValuesComeBackWhole) {
-    EncodingScope utf8(kUtf8);
-    SysFileBuilder b(std::get<0>(GetParam()));
-    b.Compressed(std::get<1>(GetParam()));
-    // M's long name has a two-byte character at bytes 64 and 65: it is cut before it.
-    const std::string mixed64 = "Name_" + std::string(58, 'x') + "Z", cut(63, 'm');
-    const std::vector<std::tuple<std::string, int, std::string>> vars{
-        {"N", 0, mixed64},           {"S256", 256, "Short256"},   {"S600", 600, "Remarks"},
-        {"M", 0, cut + "\xC3\xA9o"}, {"S2000", 2000, "LongText"}, {"L20", 20, "Label20"},
-        {"S32767", 32767, "Huge"}};
-    std::vector<Value> row;
-    for (const auto& [name, width, longName] : vars) {
-        (width ? b.String(name, width) : b.Numeric(name)).LongName(longName);
-        row.push_back(width ? Value(Sample(width)) : Value(0.5));
-    }
-    b.LongNames().VeryLongStrings().Case(row);
-    b.LongValueLabelsRecord(
-        {{"Label20", 20, {{"a", "Alpha"}}}, {"Remarks", 600, {{"none", "Nothing said"}}}});
-
-    auto source = OpenFixture(b.WriteTemp());
-    ASSERT_EQ(source->ColumnCount(), int(vars.size()));
-    std::unique_ptr<QORA_InputCaseIterator> it(source->NewIterator(nullptr));
-    ASSERT_TRUE(it->ReadCase());
-    for (int i = 0; i < source->ColumnCount(); ++i) {
-        const auto& [name, width, longName] = vars[size_t(i)];
-        EXPECT_EQ(source->GetVariable(i).GetName(), i == 3 ? cut : longName);
-        EXPECT_EQ(source->GetVariable(i).GetType(), width);
-        const double half = 0.5;
-        const std::string expected =
-            width ? Sample(width) : std::string(reinterpret_cast<const char*>(&half), 8);
-        EXPECT_EQ(std::string(static_cast<const char*>(it->ValuePointer(i)), expected.size()),
-                  expected)
-            << name;
-    }
-    EXPECT_EQ(*source->GetVariable(5).GetValueLabels().Lookup("a", -1), "Alpha");
-    EXPECT_EQ(*source->GetVariable(2).GetValueLabels().Lookup("none", -1), "Nothing said");
 }
 
 // Each file fails to open with the condition, or opens with the number of
