@@ -160,7 +160,7 @@ TEST(SysFileBuilder, VeryLongStringSegments) {
     EXPECT_EQ(I32At(f, seg0 + 4), 255);
     EXPECT_EQ(TextAt(f, seg0 + 24, 8), "REMARKS ");
     EXPECT_EQ(I32At(f, seg1 + 4), 48);
-    EXPECT_EQ(TextAt(f, seg1 + 24, 8), "REMAR1  ");
+    EXPECT_EQ(TextAt(f, seg1 + 24, 8), "REMAR0  ");
     const size_t data = b.DataStart();
     EXPECT_EQ(data, seg1 + 6 * 32 + 8);
     ASSERT_EQ(f.size(), data + 39 * 8);

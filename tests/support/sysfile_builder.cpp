@@ -243,8 +243,8 @@ Bytes SysFileBuilder::HeaderBytes() const {
 }
 
 // A variable is one record per segment (one segment unless it is a very long
-// string), each followed by its continuation records. The label, the missing
-// values and the overrides go to the first record.
+// string), each followed by its continuation records. The label goes to every
+// segment, the missing values and the overrides to the first record.
 void SysFileBuilder::WriteVar(Out& out, const Var& var) const {
     std::vector<int> segments{var.fWidth};
     if (var.fWidth > kMaxShortString) {
@@ -259,14 +259,15 @@ void SysFileBuilder::WriteVar(Out& out, const Var& var) const {
         const int width = segments[s];
         const bool first = s == 0;
         const uint32_t format = width == 0 ? FormatWord(5, 8, 2) : StringFormat(width);
-        const bool hasLabel = first && var.fLabel;
+        // Every segment is a copy of its variable: each carries the label.
+        const bool hasLabel = var.fLabel.has_value();
         out.I32(2);
         out.I32(first && var.fTypeField ? *var.fTypeField : width);
         out.I32(first && var.fHasLabelField ? *var.fHasLabelField : hasLabel);
         out.I32(first ? var.fMissingCode : 0);
         out.I32(first && var.fPrint ? *var.fPrint : format);
         out.I32(first && var.fWrite ? *var.fWrite : format);
-        out.Text(first ? var.fName : stem + std::to_string(s), 8);
+        out.Text(first ? var.fName : stem + std::to_string(s - 1), 8);
         if (hasLabel) {
             const std::string& label = *var.fLabel;
             out.I32(var.fLabelLengthField.value_or(int32_t(label.size())));
