@@ -58,8 +58,7 @@ TEST(ExportTable, HasEveryCallOnceUnderItsDecoratedNameAndTheIrregularAlias) {
         EXPECT_EQ(decorated.count(name), 1u) << name;
 }
 
-// Every call is built but those of the encoding and locale family, which
-// come with their own work; the alias is exported as soon as its call is.
+// Every call is built but the encoding and locale calls, which come apart.
 TEST(ExportTable, OnlyTheEncodingCallsMayWait) {
     const std::set<std::string> encoding = {"qoraSetInterfaceEncoding", "qoraGetInterfaceEncoding",
                                             "qoraGetFileEncoding",      "qoraGetFileCodePage",
@@ -89,9 +88,7 @@ TEST(ExportTable, LibraryExportsExactlyTheBuiltPlainNames) {
         EXPECT_EQ(exported.count(name), 1u) << "built but not exported: " << name;
 }
 
-// The definition's layout, checked where it is compiled: the offsets up to
-// the counted value are fixed, the three fields after it follow the width
-// of a pointer (412 bytes in all where pointers take 4).
+// The definition's layout on this build (412 bytes where pointers take 4).
 constexpr size_t kPointer = sizeof(char*);
 static_assert(offsetof(qoraMultRespDef, label) == 65);
 static_assert(offsetof(qoraMultRespDef, isDichotomy) == 324);
