@@ -12,7 +12,9 @@ FileEntry::FileEntry(std::unique_ptr<QORA_DataSource> dataSource, OpenMode mode)
       fMode(mode),
       fCommitted(mode != WriteMode),
       fpSystemFile(dynamic_cast<SystemFileDataSource*>(fpDataSource.get())) {
-    if (fCommitted && fpDataSource) BuildValueSlots();
+    if (!fpDataSource) return;
+    fMultResp.Reload(*fpDataSource);
+    if (fCommitted) BuildValueSlots();
 }
 
 // A file being written is completed on disk before anything else goes.
@@ -59,4 +61,21 @@ void FileEntry::BuildValueSlots() {
     for (int i = 0; i < source.ColumnCount(); ++i)
         slots.push_back({source.ValueOffset(i), source.GetVariable(i).GetType()});
     fValueSlots = std::move(slots);
+}
+
+int32_t FileEntry::ReadExtensionPiece(int32_t subtype, void* buffer, int32_t maxBytes) {
+    QORA_ASSERT(0 <= subtype && subtype < kReaderSlots);
+    auto& reader = fExtensionReaders[size_t(subtype)];
+    if (!reader)
+        reader = std::make_unique<QORA_ExtensionReader>(fpDataSource->GetExtension(subtype));
+    if (reader->Position() >= reader->ElementCount()) {
+        reader.reset();
+        return 0;
+    }
+    return reader->Read(buffer, maxBytes);
+}
+
+void FileEntry::CloseExtensionReader(int32_t subtype) {
+    QORA_ASSERT(0 <= subtype && subtype < kReaderSlots);
+    fExtensionReaders[size_t(subtype)].reset();
 }

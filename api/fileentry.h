@@ -1,6 +1,7 @@
 // The record of one open file, as the handle table keeps it.
 #pragma once
 
+#include <array>
 #include <cstdint>
 #include <map>
 #include <memory>
@@ -8,6 +9,8 @@
 #include <vector>
 
 #include "datasrc.h"
+#include "extension.h"
+#include "multrespcollector.h"
 #include "qoraio32.h"
 
 class QORA_InputCaseIterator;
@@ -50,11 +53,20 @@ struct FileEntry {
     int FindVariable(const char* name) const;
     void BuildValueSlots();
 
+    // Stored extension data handed out piece by piece, per subtype 0 to 40:
+    // the first read opens a reader at the start, each read hands out the
+    // whole elements that fit in maxBytes, and the read that finds nothing
+    // left closes the reader, so the next one starts again. Returns the
+    // elements copied into buffer.
+    int32_t ReadExtensionPiece(int32_t subtype, void* buffer, int32_t maxBytes);
+    void CloseExtensionReader(int32_t subtype);
+
+    enum { kReaderSlots = 41 };
+
     // Members are destroyed in the reverse of this order, which is the order
     // in which an entry is torn down: the extension readers first, the data
-    // source and the multiple response set collector last. The collector
-    // and the 41 extension reader slots with their element counts join with
-    // the classes they hold.
+    // source and the multiple response set collector last.
+    MultRespCollector fMultResp;
     std::unique_ptr<QORA_DataSource> fpDataSource;
     std::unique_ptr<double[]> fpBlankCase;  // write and append modes only
     std::unique_ptr<double[]> fpCaseBuffer;
@@ -66,6 +78,7 @@ struct FileEntry {
     CaseState fCaseState = CaseNone;
     bool fCommitted;                               // the dictionary is final
     SystemFileDataSource* fpSystemFile = nullptr;  // the data source, when it is a system file
+    std::array<std::unique_ptr<QORA_ExtensionReader>, kReaderSlots> fExtensionReaders;
 };
 
 // Inline: every exported call on a file passes here.

@@ -25,6 +25,7 @@ int QORA_API qoraCommitHeader(int handle) {
     return EntryCall(handle, AccessDefine, kCatchHandle, [](FileEntry& entry) -> int {
         if (entry.fpDataSource->ColumnCount() == 0) return QORA_STATUS_NO_VARIABLES;
         if (!entry.HasSystemFile()) return QORA_STATUS_NO_SYSTEM_FILE;
+        entry.fMultResp.Flush(*entry.fpDataSource);
         entry.fpSystemFile->CommitDictionary();
         entry.BuildValueSlots();
         entry.fCommitted = true;

@@ -152,6 +152,8 @@ int QORA_API qoraOpenWriteCopy(const char* fileName, const char* dictFileName, i
         FileEntry& target = copy.Entry(AccessDefine);
         target.fpDataSource->AssignFrom(*source.fpDataSource);
         target.fpDataSource->SetFileName(fileName);
+        // The sets are the copied dictionary's; sets added later join them.
+        target.fMultResp.Reload(*target.fpDataSource);
         if (const int status = target.BuildNameIndex()) return status;
         *handle = copy.Release();
         return QORA_STATUS_OK;

@@ -346,8 +346,70 @@ void PrintVariable(int handle, int index, const Variable& var) {
     PrintAttributes(handle, name, "    ");
 }
 
+void PrintMultipleResponseSets(int handle) {
+    int count = 0;
+    Check(qoraGetMultRespCount(handle, &count), "counting the multiple response sets");
+    for (int i = 0; i < count; ++i) {
+        qoraMultRespDef* def = nullptr;
+        Check(qoraGetMultRespDefByIndex(handle, i, &def), "reading a multiple response set");
+        std::printf("Multiple response set %s", def->name);
+        if (def->isDichotomy)
+            std::printf(" (dichotomy, counted value \"%s\")", def->countedValue);
+        else
+            std::printf(" (categories)");
+        if (def->label[0] != '\0') std::printf(", label \"%s\"", def->label);
+        std::printf(":");
+        for (int k = 0; k < def->numVars; ++k) std::printf(" %s", def->varNames[k]);
+        std::printf("\n");
+        qoraFreeMultRespDefStruct(def);
+    }
+}
+
+// One line per set, as the file keeps them.
+void PrintVariableSets(int handle) {
+    char* text = nullptr;
+    if (Check(qoraGetVariableSets(handle, &text), "reading the variable sets") != 0) return;
+    for (const char* line = text; *line != '\0';) {
+        const char* end = std::strchr(line, '\n');
+        const size_t length = end ? size_t(end - line) : std::strlen(line);
+        std::printf("Variable set: %.*s\n", int(length), line);
+        line += length + (end ? 1 : 0);
+    }
+    qoraFreeVariableSets(text);
+}
+
+void PrintDateVariables(int handle) {
+    int count = 0;
+    int* elements = nullptr;
+    if (Check(qoraGetDateVariables(handle, &count, &elements), "reading the date variables") != 0)
+        return;
+    std::printf("Date variables: %d, numbers %d %d %d %d\n", elements[2], elements[0], elements[1],
+                elements[3], elements[4]);
+    for (int i = 6; i + 2 < count; i += 3)
+        std::printf("    value position %d, type %d, value %d\n", elements[i], elements[i + 1],
+                    elements[i + 2]);
+    qoraFreeDateVariables(elements);
+}
+
+// The stored records of the subtypes the library leaves to callers.
+void PrintExtensionRecords(int handle) {
+    for (int subtype = 0; subtype <= 40; ++subtype) {
+        int size = 0, count = 0;
+        if (qoraGetExtensionDataDesc(handle, subtype, &size, &count) != 0 || count == 0) continue;
+        std::printf("Extension record %d: %d elements of %d bytes\n", subtype, count, size);
+    }
+}
+
+void PrintExtras(int handle) {
+    PrintMultipleResponseSets(handle);
+    PrintVariableSets(handle);
+    PrintDateVariables(handle);
+    PrintExtensionRecords(handle);
+}
+
 void PrintDictionary(int handle, const std::vector<Variable>& variables) {
     PrintHeader(handle, variables);
+    PrintExtras(handle);
     std::printf("\n");
     for (size_t i = 0; i < variables.size(); ++i) PrintVariable(handle, int(i), variables[i]);
 }

@@ -55,6 +55,10 @@ void CaseLayout::Erase(size_t start, size_t finish) {
     fTotal -= delta;
 }
 
+size_t CaseLayout::FirstAtOrAfter(int32_t unit) const {
+    return size_t(std::lower_bound(fOffsets.begin(), fOffsets.end(), unit) - fOffsets.begin());
+}
+
 void QORA_DataSource::Observer::IteratorCreated(QORA_InputCaseIterator*) {}
 
 QORA_DataSource::Data::Data() : fTimeStamp(LocalTimeStamp()) {

@@ -13,6 +13,7 @@
 
 #include "Attributes.h"
 #include "extension.h"
+#include "trendsinfo.h"
 #include "variable.h"
 
 class QORA_InputCaseIterator;
@@ -33,6 +34,9 @@ class CaseLayout {
     int32_t Total() const { return fTotal; }
     // Units of the last variable; 0 once a delete from the front empties it.
     int32_t LastSize() const { return fLastSize; }
+    // The first variable whose values start at or after the unit; Count()
+    // when there is none.
+    size_t FirstAtOrAfter(int32_t unit) const;
 
     // Makes room for one more variable, so that a following change cannot
     // fail half done.
@@ -175,6 +179,9 @@ class QORA_DataSource {
     const Attributes& FileAttributes() const { return fData.fAttributes; }
     Attributes& FileAttributes() { return fData.fAttributes; }
 
+    const QORA_TrendsInfo& DateInfo() const { return fData.fDateInfo; }
+    QORA_TrendsInfo& DateInfo() { return fData.fDateInfo; }
+
   private:
     struct Data {
         Data();
@@ -190,7 +197,9 @@ class QORA_DataSource {
         QORA_ExtensionList fExtensions;
         std::string fFileName;
         double fTimeStamp;
-        // The date-variable information joins here, bound to this data source.
+        // Refers to variables by identity, so a copy of the data block is
+        // right for the copy's dictionary as it stands.
+        QORA_TrendsInfo fDateInfo;
         Attributes fAttributes;
     };
 

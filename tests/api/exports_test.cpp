@@ -58,6 +58,15 @@ TEST(ExportTable, HasEveryCallOnceUnderItsDecoratedNameAndTheIrregularAlias) {
         EXPECT_EQ(decorated.count(name), 1u) << name;
 }
 
+// Every call is built but the encoding and locale calls, which come apart.
+TEST(ExportTable, OnlyTheEncodingCallsMayWait) {
+    const std::set<std::string> encoding = {"qoraSetInterfaceEncoding", "qoraGetInterfaceEncoding",
+                                            "qoraGetFileEncoding",      "qoraGetFileCodePage",
+                                            "qoraIsCompatibleEncoding", "qoraSetLocale"};
+    for (const Call& call : kCalls)
+        EXPECT_TRUE(call.built || encoding.count(call.name) == 1) << call.name << " is not built";
+}
+
 TEST(ExportTable, LibraryExportsExactlyTheBuiltPlainNames) {
     std::set<std::string> built, exported;
     for (const Call& call : kCalls)
@@ -79,24 +88,21 @@ TEST(ExportTable, LibraryExportsExactlyTheBuiltPlainNames) {
         EXPECT_EQ(exported.count(name), 1u) << "built but not exported: " << name;
 }
 
-TEST(PublicHeader, MultipleResponseDefinitionLayout) {
-    const size_t p = sizeof(char*);
-    const std::pair<size_t, size_t> offsets[] = {
-        {offsetof(qoraMultRespDef, label), 65},
-        {offsetof(qoraMultRespDef, isDichotomy), 324},
-        {offsetof(qoraMultRespDef, isNumeric), 328},
-        {offsetof(qoraMultRespDef, useCategoryLabels), 332},
-        {offsetof(qoraMultRespDef, useFirstVarLabel), 336},
-        {offsetof(qoraMultRespDef, reserved), 340},
-        {offsetof(qoraMultRespDef, numericCountedValue), 396},
-        {offsetof(qoraMultRespDef, countedValue), 400},
-        {offsetof(qoraMultRespDef, varNames), 400 + p},
-        {offsetof(qoraMultRespDef, numVars), 400 + 2 * p},
-        {sizeof(qoraMultRespDef), (400 + 3 * p + sizeof(int) - 1) / p * p},  // 412 for 4-byte p
-    };
-    for (size_t i = 0; i < std::size(offsets); ++i)
-        EXPECT_EQ(offsets[i].first, offsets[i].second) << "field " << i;
-}
+// The definition's layout on this build (412 bytes where pointers take 4).
+constexpr size_t kPointer = sizeof(char*);
+static_assert(offsetof(qoraMultRespDef, label) == 65);
+static_assert(offsetof(qoraMultRespDef, isDichotomy) == 324);
+static_assert(offsetof(qoraMultRespDef, isNumeric) == 328);
+static_assert(offsetof(qoraMultRespDef, useCategoryLabels) == 332);
+static_assert(offsetof(qoraMultRespDef, useFirstVarLabel) == 336);
+static_assert(offsetof(qoraMultRespDef, reserved) == 340);
+static_assert(offsetof(qoraMultRespDef, numericCountedValue) == 396);
+static_assert(offsetof(qoraMultRespDef, countedValue) == 400);
+static_assert(offsetof(qoraMultRespDef, varNames) == 400 + kPointer);
+static_assert(offsetof(qoraMultRespDef, numVars) == 400 + 2 * kPointer);
+static_assert(sizeof(qoraMultRespDef) ==
+              (400 + 3 * kPointer + sizeof(int) - 1) / kPointer * kPointer);
+static_assert(kPointer != 4 || sizeof(qoraMultRespDef) == 412);
 
 TEST(PublicHeader, CompilesAsStrictC) {
     const std::string data = QORA_TEST_DATA_DIR;  // <source>/tests/data

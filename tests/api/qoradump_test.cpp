@@ -82,6 +82,25 @@ TEST(QoraDump, DictionaryShowsEveryProperty) {
     EXPECT_EQ(output.find("Id,Sex"), std::string::npos);
 }
 
+TEST(QoraDump, DictionaryShowsSetsDateVariablesAndStoredRecords) {
+    fixture::SysFileBuilder b;
+    b.Numeric("YEAR_");
+    b.Numeric("a");
+    b.Numeric("b");
+    b.MultipleResponseSets({b.DichotomySetLine("$ab", "1", "Both", {"a", "b"})});
+    b.VariableSets({b.VariableSetLine("Pair", {"a", "b"})});
+    b.DateInfo({0, 1, 1, 1, 1, 1, 1, 2, 1});
+    b.Extension(30, 4, b.Int32s({1, 2, 3}));
+    const DumpResult run = Dump("--dict " + b.WriteTemp());
+    ASSERT_EQ(run.exitCode, 0) << run.output;
+    for (const char* line : {"Multiple response set $ab (dichotomy, counted value \"1\"), label "
+                             "\"Both\": a b\n",
+                             "Variable set: Pair= a b\n", "Date variables: 1, numbers 0 1 1 1\n",
+                             "    value position 1, type 2, value 1\n",
+                             "Extension record 30: 3 elements of 4 bytes\n"})
+        EXPECT_NE(run.output.find(line), std::string::npos) << line << run.output;
+}
+
 TEST(QoraDump, ErrorsNameTheStatusAndExitNonZero) {
     fixture::TempDir dir;
     const std::string bad = dir.Path() + "/bad.qsf";
