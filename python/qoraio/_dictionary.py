@@ -43,7 +43,7 @@ def runs(numbers):
 
 def names_and_widths(h):
     count, names, types = _int(), ctypes.POINTER(_str)(), ctypes.POINTER(_int)()
-    check(lib.qoraGetVarNames(h, ctypes.byref(count), ctypes.byref(names), ctypes.byref(types)), "cannot list the variables")
+    check(lib.qoraGetVarNames(h, *map(ctypes.byref, (count, names, types))), "cannot list the variables")
     try:
         return [(text(names[i]), types[i]) for i in range(count.value)]
     finally:
@@ -64,7 +64,8 @@ def format_of(call, h, name):
 
 def _label(h, name):
     buffer = ctypes.create_string_buffer(1024)
-    status = check(lib.qoraGetVarLabelLong(h, name, buffer, len(buffer), None), "cannot read the label of %r" % text(name))
+    status = check(lib.qoraGetVarLabelLong(h, name, buffer, len(buffer), None),
+                   "cannot read the label of %r" % text(name))
     return text(buffer.value) if status == 0 and buffer.value else None
 
 
@@ -72,14 +73,15 @@ def missing_of(h, name, width):
     count = _int()
     if width == 0:
         slots = [_dbl() for _ in range(3)]
-        check(lib.qoraGetVarNMissingValues(h, name, ctypes.byref(count), *map(ctypes.byref, slots)), "cannot read the missing values of %r" % text(name))
+        status = lib.qoraGetVarNMissingValues(h, name, ctypes.byref(count), *map(ctypes.byref, slots))
         values = [s.value for s in slots]
     elif width <= 8:
         slots = [ctypes.create_string_buffer(9) for _ in range(3)]
-        check(lib.qoraGetVarCMissingValues(h, name, ctypes.byref(count), *slots), "cannot read the missing values of %r" % text(name))
+        status = lib.qoraGetVarCMissingValues(h, name, ctypes.byref(count), *slots)
         values = [text(s.value).rstrip(" ") for s in slots]
     else:
         return [], None
+    check(status, "cannot read the missing values of %r" % text(name))
     n = count.value
     if n < 0:
         return values[2:3] if n == -3 else [], (values[0], values[1])
@@ -94,7 +96,8 @@ def value_labels_of(h, name, width):
     else:
         values = ctypes.POINTER(_str)()
         get, free = lib.qoraGetVarCValueLabels, lib.qoraFreeVarCValueLabels
-    status = check(get(h, name, ctypes.byref(values), ctypes.byref(labels), ctypes.byref(count)), "cannot read the value labels of %r" % text(name))
+    status = check(get(h, name, *map(ctypes.byref, (values, labels, count))),
+                   "cannot read the value labels of %r" % text(name))
     if status == NO_LABELS:
         return {}
     try:

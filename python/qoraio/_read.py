@@ -10,7 +10,7 @@ import pandas as pd
 from . import _dates
 from ._dictionary import (Handle, file_items, format_of, missing_of, names_and_widths, runs, units,
                           value_labels_of, variable)
-from ._lib import check, file_name, lib, loops, raw, text
+from ._lib import QoraError, check, file_name, lib, loops, raw, text
 
 
 def read_meta(path):
@@ -36,9 +36,9 @@ def read(path, columns=None, cases=None, labels=False, user_missing=False):
         all_vars = names_and_widths(h)
         offsets = np.cumsum([0] + [units(w) for _, w in all_vars])
         size = _case_size(h, int(offsets[-1]))
-        chosen = _choose(all_vars, columns)
+        picked = _choose(all_vars, columns)
         block = _read_cases(h, name, size, cases, [int(offsets[i]) for i, (_, w) in enumerate(all_vars) if w == 0])
-        chosen = [(_essentials(h, *all_vars[i], labels), int(offsets[i])) for i in chosen]
+        chosen = [(_essentials(h, *all_vars[i], labels), int(offsets[i])) for i in picked]
     return _frame(block, chosen, labels, user_missing)
 
 
@@ -55,7 +55,7 @@ def _case_size(h, expected_units):
     size = ctypes.c_int()
     check(lib.qoraGetCaseSize(h, ctypes.byref(size)), "cannot read the case size")
     if size.value != expected_units * 8:
-        raise ValueError("the case size %d does not match the variables' %d bytes" % (size.value, expected_units * 8))
+        raise QoraError(6, "the case size %d does not match the variables' %d bytes" % (size.value, expected_units * 8))
     return size.value
 
 

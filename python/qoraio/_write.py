@@ -29,9 +29,10 @@ def write(df, path, meta=None, compress=True):
     """
     given = {v["name"]: v for v in (meta or {}).get("variables", [])}
     columns = [_Column(str(name), df[name], given.get(str(name), {})) for name in df.columns]
-    name = file_name(path)
+    name, opened = file_name(path), False
     try:
         with Handle(name, lib.qoraOpenWrite, lib.qoraCloseWrite) as h:
+            opened = True
             check(lib.qoraSetCompression(h, int(bool(compress))), "cannot set the compression")
             for column in columns:
                 column.define(h)
@@ -39,7 +40,7 @@ def write(df, path, meta=None, compress=True):
             check(lib.qoraCommitHeader(h), "cannot write the dictionary")
             _write_cases(h, columns, len(df))
     except BaseException:
-        if os.path.exists(name):
+        if opened and os.path.exists(name):  # no half-written file is left
             os.remove(name)
         raise
 
@@ -67,14 +68,18 @@ class _Column:
             self.given = {}  # the column is not of the type the dictionary gives
 
     def _categories(self, series):
-        """The values behind a categorical: those the given value labels name,
-        when they name every category; else codes 1, 2, ... labelled with the
-        categories."""
+        """The values behind a categorical, when the given value labels name
+        them (a category that is no label being its value's own text, as
+        `read` makes it); else codes 1, 2, ... labelled with the categories."""
         given = self.given.get("value_labels") or {}
         values = {label: value for value, label in given.items()}
-        if given and all(c in values for c in series.cat.categories):
-            restored = series.cat.rename_categories([values[c] for c in series.cat.categories])
-            return restored.astype(object if self.given.get("width") else np.float64)
+        strings = bool(self.given.get("width"))
+        try:
+            if given:
+                originals = [values[c] if c in values else (c if strings else float(c)) for c in series.cat.categories]
+                return series.cat.rename_categories(originals).astype(object if strings else np.float64)
+        except (TypeError, ValueError):
+            pass
         self.given.pop("value_labels", None)
         self.labels = {float(i + 1): str(c) for i, c in enumerate(series.cat.categories)}
         codes = series.cat.codes.to_numpy().astype(np.float64)
@@ -100,7 +105,6 @@ class _Column:
             if given.get(item) is not None:
                 check(call(h, key, given[item]), "cannot set the %s of %r" % (item.replace("_", " "), self.name))
         _define_attributes(h, "qoraSetVarAttributes", given.get("attributes"), key)
-
 
     def _format(self, given):
         """A given format, unless it no longer fits a string grown wider."""
@@ -176,8 +180,10 @@ def _write_cases(h, columns, rows):
         for column, offset in zip(columns, offsets):
             values = column.values[first: first + len(part)]
             if column.width:
-                part.view(np.uint8)[:, offset * 8: offset * 8 + values.itemsize] = values.view(np.uint8).reshape(len(part), -1)
+                cells = values.view(np.uint8).reshape(len(part), -1)
+                part.view(np.uint8)[:, offset * 8: offset * 8 + cells.shape[1]] = cells
             else:
                 part[:, offset] = values
-        status = loops.qoraio_write_cases(write_case, h, part.ctypes.data, len(part), case_units, numeric.ctypes.data, len(numeric) // 2)
+        status = loops.qoraio_write_cases(write_case, h, part.ctypes.data, len(part), case_units,
+                                          numeric.ctypes.data, len(numeric) // 2)
         check(status, "cannot write case %d" % first)
