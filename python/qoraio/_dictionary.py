@@ -2,6 +2,7 @@
 variable and one for the file, in the shape that `write` takes back."""
 
 import ctypes
+import threading
 
 import numpy as np
 
@@ -10,19 +11,33 @@ from ._lib import ENCODING, NO_LABELS, check, lib, raw, text
 _int, _dbl, _str = ctypes.c_int, ctypes.c_double, ctypes.c_char_p
 
 
+# The library's calls must not overlap, and it takes no lock of its own.
+_serial = threading.Lock()
+
+
 class Handle:
-    """An open file handle that is closed however the block ends."""
+    """An open file handle, closed however the block ends; threads take
+    turns for the whole block."""
 
     def __init__(self, path, open_call, close_call):
-        self.value = _int(-1)
-        check(open_call(path, ctypes.byref(self.value)), "cannot open %r" % path.decode(ENCODING, "replace"))
-        self._close = close_call
+        self._path, self._open, self._close = path, open_call, close_call
 
     def __enter__(self):
-        return self.value.value
+        _serial.acquire()
+        handle = _int(-1)
+        try:
+            check(self._open(self._path, ctypes.byref(handle)), "cannot open %r" % self._path.decode(ENCODING, "replace"))
+        except BaseException:
+            _serial.release()
+            raise
+        self._handle = handle.value
+        return self._handle
 
     def __exit__(self, *exc):
-        self._close(self.value.value)
+        try:
+            self._close(self._handle)
+        finally:
+            _serial.release()
 
 
 def units(width):
