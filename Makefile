@@ -32,11 +32,15 @@ build-asan: deps
 run: build
 	./build/tools/qoradump examples/sample.qsf
 
+# The Python tests run last, against each build: for the sanitizer build the
+# sanitizer and C++ runtimes are preloaded, as the interpreter links neither,
+# and the interpreter's own allocations are not leak-checked.
 test: build build-asan locales
 	cd build && ctest --output-on-failure -j $(JOBS)
 	cd build-asan && ASAN_OPTIONS=detect_leaks=1 ctest --output-on-failure -j $(JOBS)
-	cd python && QORAIO_LIBRARY_DIR=../build-asan LD_PRELOAD=$$(g++ -print-file-name=libasan.so) \
-	  ASAN_OPTIONS=detect_leaks=0 $(PYTHON) -m pytest -q -p no:cacheprovider tests
+	cd python && QORAIO_LIBRARY_DIR=../build-asan ASAN_OPTIONS=detect_leaks=0 \
+	  LD_PRELOAD="$$(g++ -print-file-name=libasan.so) $$(g++ -print-file-name=libstdc++.so)" \
+	  $(PYTHON) -m pytest -q -p no:cacheprovider tests
 	cd python && $(PYTHON) -m pytest -q -p no:cacheprovider tests
 
 # Seeds from the fixture builder, then a bounded run of the fuzzer; new
