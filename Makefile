@@ -2,7 +2,10 @@
 # rights for the package step): `make run` and `make test`; `make fuzz` and
 # `make bench` for the fuzz run and the benchmarks.
 JOBS ?= $(shell nproc)
-PACKAGES := cmake make g++ clang libclang-rt-14-dev libicu-dev libgtest-dev libgmock-dev libbenchmark-dev locales
+PACKAGES := cmake make g++ clang libclang-rt-14-dev libicu-dev libgtest-dev libgmock-dev libbenchmark-dev locales \
+  python3-pandas python3-numpy python3-pytest
+# Debian's own interpreter, which sees the packages above.
+PYTHON := /usr/bin/python3
 SUDO := $(shell [ "$$(id -u)" = 0 ] || echo sudo)
 
 .PHONY: run test deps build build-asan locales bench fuzz clean
@@ -29,9 +32,16 @@ build-asan: deps
 run: build
 	./build/tools/qoradump examples/sample.qsf
 
+# The Python tests run last, against each build: for the sanitizer build the
+# sanitizer and C++ runtimes are preloaded, as the interpreter links neither,
+# and the interpreter's own allocations are not leak-checked.
 test: build build-asan locales
 	cd build && ctest --output-on-failure -j $(JOBS)
 	cd build-asan && ASAN_OPTIONS=detect_leaks=1 ctest --output-on-failure -j $(JOBS)
+	cd python && QORAIO_LIBRARY_DIR=../build-asan ASAN_OPTIONS=detect_leaks=0 \
+	  LD_PRELOAD="$$(g++ -print-file-name=libasan.so) $$(g++ -print-file-name=libstdc++.so)" \
+	  $(PYTHON) -m pytest -q -p no:cacheprovider tests
+	cd python && $(PYTHON) -m pytest -q -p no:cacheprovider tests
 
 # Seeds from the fixture builder, then a bounded run of the fuzzer; new
 # inputs collect in build-fuzz/corpus, crashes in build-fuzz/artifacts.
@@ -47,8 +57,9 @@ fuzz: deps
 
 bench: deps
 	cmake -S . -B build-bench -DCMAKE_BUILD_TYPE=Release -DQORA_BENCH=ON -DQORA_TESTS=OFF >/dev/null
-	cmake --build build-bench -j $(JOBS) --target qora_bench
+	cmake --build build-bench -j $(JOBS) --target qora_bench qoraio_cases
 	./build-bench/bench/qora_bench
+	QORAIO_LIBRARY_DIR=build-bench $(PYTHON) bench/python_bench.py
 
 clean:
 	rm -rf build build-asan build-fuzz build-bench
