@@ -156,7 +156,10 @@ std::unique_ptr<QORA_DataSource> OpenForReading(const char* fileName, WarningSin
         // wrapper refuses the name.
         if (ConverterPtr cnv{OpenConverter(encoding.c_str())})
             source = ReadInOwnEncoding(std::move(source), name, std::move(cnv));
-        return std::make_unique<UTF8DataSource>(std::move(source), encoding, warnings);
+        auto wrapper = std::make_unique<UTF8DataSource>(std::move(source), encoding, warnings);
+        // Names cut to their 64 bytes may now repeat one another.
+        RepairNames(*wrapper);
+        return wrapper;
     }
     if (IsSameEncoding(encoding.c_str(), "UTF-8")) {
         source = ReadInOwnEncoding(std::move(source), name, nullptr);

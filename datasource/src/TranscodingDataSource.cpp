@@ -141,12 +141,16 @@ void TranscodingDataSource::ConvertSets() {
 std::string TranscodingDataSource::Convert(const std::string& text, int maxBytes) {
     UConverter* cnv = _my->_converter.get();
     int error = 0;
-    const int size =
-        maxBytes >= 0 ? maxBytes : fDirection.length(cnv, text.data(), Length(text), &error);
-    std::string converted(size_t(std::max(size, 0)), ' ');
+    // One byte to spare: a result that fills its buffer exactly reports no loss.
+    const int size = std::max(fDirection.length(cnv, text.data(), Length(text), &error), 0) + 1;
+    std::string converted(size_t(size), ' ');
     const int n = fDirection.convert(cnv, &converted[0], size, text.data(), Length(text), &error);
+    converted.resize(size_t(std::clamp(n, 0, size)));
+    if (maxBytes >= 0 && converted.size() > size_t(maxBytes)) {
+        converted.resize(std::strlen(mbTruncate(&converted[0], maxBytes)));
+        error = 1;
+    }
     if (error != 0) _my->_lossy = true;
-    converted.resize(size_t(std::clamp(n, 0, std::max(size, 0))));
     return converted;
 }
 

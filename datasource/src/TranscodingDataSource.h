@@ -62,7 +62,8 @@ class TranscodingDataSource : public QORA_DataSource {
     void AddToPlan(const PlanEntry& entry);
     QORA_VLMap Convert(const QORA_VLMap& labels);
     void ConvertSets();
-    // The text converted; at most maxBytes, cut at a whole character.
+    // The text converted; at most maxBytes (when not negative), cut at a
+    // whole character.
     std::string Convert(const std::string& text, int maxBytes = -1);
     Attributes Convert(const Attributes& attributes);
 
