@@ -23,10 +23,6 @@ struct Warnings : WarningSink {
     void Warning(long number, const std::string&) override { numbers.push_back(number); }
 };
 
-std::string Value(QORA_InputCaseIterator& it, int index, size_t bytes) {
-    return std::string(static_cast<const char*>(it.ValuePointer(index)), bytes);
-}
-
 std::string Repeat(const std::string& text, int n) {
     std::string out;
     while (n-- > 0) out += text;
@@ -64,11 +60,14 @@ TEST(Transcoding, CodePageFileSeenInUtf8) {
 
     const std::unique_ptr<QORA_InputCaseIterator> it(source->NewIterator(nullptr));
     ASSERT_TRUE(it->ReadCase());
-    EXPECT_EQ(Value(*it, 0, 32), Repeat(zhongUtf8, 5) + std::string(17, ' '));
+    auto Value = [&](int index, size_t bytes) {
+        return std::string(static_cast<const char*>(it->ValuePointer(index)), bytes);
+    };
+    EXPECT_EQ(Value(0, 32), Repeat(zhongUtf8, 5) + std::string(17, ' '));
     // A malformed byte is shown as "?"; a value never passes its units.
-    EXPECT_EQ(Value(*it, 1, 32), Repeat(zhongUtf8, 4) + "?" + std::string(19, ' '));
+    EXPECT_EQ(Value(1, 32), Repeat(zhongUtf8, 4) + "?" + std::string(19, ' '));
     EXPECT_EQ(std::memcmp(it->ValuePointer(4), &odd, 8), 0);
-    EXPECT_EQ(Value(*it, 5, 16), zhongUtf8 + "?" + std::string(12, ' '));
+    EXPECT_EQ(Value(5, 16), zhongUtf8 + "?" + std::string(12, ' '));
 }
 
 TEST(Transcoding, WarningsOfACodePageInterface) {

@@ -60,18 +60,14 @@ Bytes PlainFile(Endian endian, bool compressed) {
     return b.Build();
 }
 
-// A file whose text is in the encoding named: a name, a label and a value
-// given in that encoding's bytes.
+// A file whose text is in the encoding named: a name and a text given in
+// that encoding's bytes, as a label, value labels, a missing value and a value.
 Bytes EncodedFile(const std::string& encoding, const std::string& name, const std::string& text) {
     SysFileBuilder b;
     const std::string value = text.substr(0, 8);
-    b.Numeric("N").LongName(name).Label(text);
-    b.String("S", 8).MissingStrings({value});
-    b.ValueLabels({{1.0, text}}, {b.Slot("N")});
+    b.String("S", 8).LongName(name).Label(text).MissingStrings({value});
     b.ValueLabels({{value, text}}, {b.Slot("S")});
-    b.LongNames().Encoding(encoding);
-    b.FileAttributes(SysFileBuilder::AttributeText({{"Origin", {text}}}));
-    b.Case({1.0, value});
+    b.LongNames().Encoding(encoding).Case({value});
     return b.Build();
 }
 
