@@ -150,8 +150,10 @@ std::unique_ptr<QORA_DataSource> OpenForReading(const char* fileName, WarningSin
     const QORA_FileStream::Data::FileName name = NameRecord(fileName);
     auto source = std::make_unique<SystemFileDataSource>(name);
     const std::string encoding = FileEncodingName(source->Settings());
-    if (IsSameEncoding(encoding.c_str(), InterfaceEncodingName().c_str())) return source;
-    if (mbIsUtf8Mode()) {
+    const std::string interfaceEncoding = InterfaceEncodingName();
+    if (IsSameEncoding(encoding.c_str(), interfaceEncoding.c_str())) return source;
+    // A locale whose code page is UTF-8 makes a UTF-8 interface in either mode.
+    if (IsSameEncoding(interfaceEncoding.c_str(), "UTF-8")) {
         // Without a converter there is nothing to read the text with; the
         // wrapper refuses the name.
         if (ConverterPtr cnv{OpenConverter(encoding.c_str())})

@@ -24,8 +24,8 @@ class TranscodingDataSource : public QORA_DataSource {
     int64_t CaseCount() const override { return fpFile->CaseCount(); }
 
   protected:
-    // How one direction converts: the routine, the width a string of width w
-    // gets, and the warning number of a lossy dictionary.
+    // How one direction converts: the conversion and its length, the width a
+    // string of width w gets, and the warning number of a lossy dictionary.
     struct Direction {
         int (*convert)(UConverter*, char*, int, const char*, int, int*);
         int (*length)(UConverter*, const char*, int, int*);

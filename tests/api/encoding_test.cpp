@@ -31,7 +31,7 @@ std::string Recode(const std::string& cnvName, const std::string& text, bool toU
 std::string Trimmed(std::string s) { return s.erase(s.find_last_not_of(' ') + 1); }
 
 struct Row {
-    const Encoding* locale;    // null: no code-page locale holds the texts
+    const Encoding* locale;    // for code-page mode; kUtf8: its code page is UTF-8
     std::string fileEncoding;  // a number: named by the character code, not by a record
     std::string name, label, valueLabel, value;  // UTF-8; the value fits in 8 bytes
 };
@@ -40,7 +40,7 @@ const Row kRows[] = {
     {&kLatin1, "ISO-8859-1", "Größe", "Maß der Länge", "groß", "Café"},
     {&kCp1252, "1252", "Preis€", "Preis in €", "über 5 €", "5 €"},
     {&kGbk, "GBK", "姓名", "中文标签", "男性", "北京"},
-    {nullptr, "windows-31j", "名前", "日本語の名前", "男性", "東京"},
+    {&kUtf8, "windows-31j", "名前", "日本語の名前", "男性", "東京"},
     {&kCp1252, "UTF-8", "Größe€", "Maß in €", "über", "5 €"},
     {&kGbk, "UTF-8", "姓名", "中文标签", "男性", "北京"},
 };
@@ -105,8 +105,9 @@ std::string ReadBack(const std::string& path) {
 
 TEST(Encodings, EveryFileReadsBackInEitherModeCharacterForCharacter) {
     for (const Row& r : kRows) {
-        const Encoding& locale = r.locale ? *r.locale : kUtf8;
-        for (int source = 0; source < (r.locale ? 3 : 1); ++source) {  // built, code page, UTF-8
+        const Encoding& locale = *r.locale;
+        const bool utf8Locale = r.locale == &kUtf8;
+        for (int source = 0; source < 3; ++source) {  // built, written in code page, in UTF-8
             SysFileBuilder b;
             TempDir dir;
             std::string path;
@@ -115,14 +116,15 @@ TEST(Encodings, EveryFileReadsBackInEitherModeCharacterForCharacter) {
                 path = source == 0 ? BuiltFile(r, b)
                                    : WrittenFile(r, dir.Path() + "/w.qsf", source == 2);
             }
-            const bool inCodePage = source == 1 || (source == 0 && r.fileEncoding != "UTF-8");
-            for (int utf8 = r.locale ? 0 : 1; utf8 <= 1; ++utf8) {
+            const bool inCodePage =
+                source == 0 ? r.fileEncoding != "UTF-8" : source == 1 && !utf8Locale;
+            for (int utf8 = 0; utf8 <= 1; ++utf8) {
                 SCOPED_TRACE(r.fileEncoding + " source " + std::to_string(source) + " utf8 " +
                              std::to_string(utf8));
                 EncodingScope reading({locale.locale, locale.converter, utf8});
                 const std::string read = ReadBack(path);
                 // Strings three times as wide keep no missing values a call can show.
-                const bool wide = utf8 && inCodePage;
+                const bool wide = inCodePage && (utf8 || utf8Locale);
                 EXPECT_EQ(utf8 ? read : Recode(locale.converter, read, true),
                           r.name + "|" + r.label + "|" + r.valueLabel + "|" + r.value + "=" +
                               r.valueLabel + "|" + (wide ? "24||" : "8|" + r.value + "|") +
