@@ -165,8 +165,8 @@ std::unique_ptr<QORA_DataSource> OpenForReading(const char* fileName, WarningSin
     }
     if (IsSameEncoding(encoding.c_str(), "UTF-8")) {
         source = ReadInOwnEncoding(std::move(source), name, nullptr);
-        auto wrapper = std::make_unique<CodePageDataSource>(std::move(source),
-                                                            InterfaceEncodingName(), warnings);
+        auto wrapper =
+            std::make_unique<CodePageDataSource>(std::move(source), interfaceEncoding, warnings);
         RepairNames(*wrapper);
         return wrapper;
     }
