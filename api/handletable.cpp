@@ -13,6 +13,12 @@ int HandleTable::Insert(std::unique_ptr<FileEntry> entry, int* handle) {
     return QORA_STATUS_TOO_MANY_FILES;
 }
 
+bool HandleTable::AnyOpen() const {
+    for (const auto& slot : fSlots)
+        if (slot) return true;
+    return false;
+}
+
 int HandleTable::Close(int handle) {
     FileEntry* entry;
     const int status = Lookup(handle, AccessAny, &entry);

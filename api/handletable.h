@@ -19,6 +19,8 @@ class HandleTable {
     // Empties the slot, then destroys its entry: 0, or 5 for a bad handle.
     // The slot is free even when tearing the entry down fails.
     int Close(int handle);
+    // Whether any slot holds a file.
+    bool AnyOpen() const;
 
   private:
     std::array<std::unique_ptr<FileEntry>, kSlots> fSlots;

@@ -277,6 +277,7 @@ QORA_EXPORT int QORA_API qoraFreeAttributes(char** names, char** texts, int coun
 /* Encodings and locale. */
 QORA_EXPORT int QORA_API qoraSetInterfaceEncoding(int encoding); /* 0 code page, 1 UTF-8 */
 QORA_EXPORT int QORA_API qoraGetInterfaceEncoding(void);         /* the value, not a status */
+/* encoding: a buffer of at least 65 bytes; a longer name is cut to 64. */
 QORA_EXPORT int QORA_API qoraGetFileEncoding(int handle, char* encoding);
 QORA_EXPORT int QORA_API qoraGetFileCodePage(int handle, int* codePage);
 /* Decorated qoraIsCompatibleEncoding@8; its plain name is spelt "Endoding". */

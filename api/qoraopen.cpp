@@ -7,6 +7,7 @@
 #include "SystemFileDataSource.h"
 #include "accessprobe.h"
 #include "case.h"
+#include "codepage.h"
 #include "qoracall.h"
 
 namespace {
@@ -17,6 +18,8 @@ std::unique_ptr<QORA_DataSource> NewDataSource(OpenMode mode, const char* fileNa
     if (mode != WriteMode) return OpenForReading(fileName, nullptr);
     auto source = std::make_unique<SystemFileDataSource>();
     source->SetFileName(fileName);
+    // Its text comes from the caller, in the interface encoding.
+    source->Settings().fEncodingName = InterfaceEncodingName();
     return source;
 }
 

@@ -9,6 +9,7 @@
 #include <cstdio>
 #include <cstdlib>
 #include <cstring>
+#include <utility>
 #include <vector>
 
 #include "qoralocale.h"
@@ -260,6 +261,11 @@ ConverterPtr CloneConverter(UConverter* cnv) {
     return clone;
 }
 
+UConverter* ExchangeCurrentConverter(UConverter* cnv) {
+    ++gConverterChanges;
+    return std::exchange(gConverter, cnv);
+}
+
 unsigned CodePageConverterChanges() { return gConverterChanges; }
 
 std::string EncodingDisplayName(UConverter* cnv) {
@@ -348,6 +354,10 @@ bool IsSameEncoding(const char* a, const char* b) {
     const char* canonicalA = Alias(a, 0);
     const char* canonicalB = Alias(b, 0);
     return canonicalA && canonicalB && strcmp(canonicalA, canonicalB) == 0;
+}
+
+std::string InterfaceEncodingName() {
+    return mbIsUtf8Mode() ? "UTF-8" : EncodingDisplayName(nullptr);
 }
 
 namespace {

@@ -43,6 +43,9 @@ int GetLocaleString(char* buffer, int size);
 bool GetSystemLocaleInfo(std::string& locale, std::string& encoding);
 // True when ICU knows both names and they denote the same converter.
 bool IsSameEncoding(const char* a, const char* b);
+// The name of the encoding of text at the interface: "UTF-8" in UTF-8 mode,
+// else the display name of the current converter.
+std::string InterfaceEncodingName();
 // The ISO 639 language and ISO 3166 country codes of the runtime's current
 // character-type locale; "en" and "" when it matches no known locale.
 void LocaleToIsoCodes(std::string& language, std::string& country);
@@ -56,6 +59,10 @@ void LocaleNameToIsoCodes(const char* name, std::string& language, std::string& 
 UConverter* CurrentConverter();
 // A private clone of cnv, or of the current converter when cnv is null.
 ConverterPtr CloneConverter(UConverter* cnv);
+// Makes cnv the current converter without taking it over and returns the
+// one it replaces (null when none was made yet); counts as a change. For a
+// while only: the caller puts the previous one back.
+UConverter* ExchangeCurrentConverter(UConverter* cnv);
 // Goes up by one each time the current converter is replaced.
 unsigned CodePageConverterChanges();
 // The current collator, created on first use for ICU's default locale.

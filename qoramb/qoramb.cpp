@@ -8,6 +8,7 @@
 #include <atomic>
 #include <cstring>
 #include <cwchar>
+#include <utility>
 
 #include "codepage.h"
 
@@ -16,6 +17,8 @@ namespace {
 // Changed only while no file is open; atomics keep concurrent readers sound.
 std::atomic<bool> gUtf8Mode{false};
 std::atomic<unsigned> gModeChanges{0};
+// Set while a file's text is read in its own code page (mbTextEncodingScope).
+std::atomic<bool> gLengthsFromConverter{false};
 
 // Byte length of a text: up to its terminator, never beyond a given length
 // (a negative length means the terminator ends it).
@@ -334,11 +337,30 @@ void mbSetUtf8Mode(int flag) {
 
 unsigned mbGeneration() { return gModeChanges + CodePageConverterChanges(); }
 
+mbTextEncodingScope::mbTextEncodingScope()
+    : fMode(mbIsUtf8Mode()), fLengthsFromConverter(gLengthsFromConverter) {
+    mbSetUtf8Mode(1);
+}
+
+mbTextEncodingScope::mbTextEncodingScope(ConverterPtr cnv)
+    : fMode(mbIsUtf8Mode()), fLengthsFromConverter(gLengthsFromConverter), fCnv(std::move(cnv)) {
+    fpPrevious = ExchangeCurrentConverter(fCnv.get());
+    gLengthsFromConverter = true;
+    mbSetUtf8Mode(0);
+}
+
+mbTextEncodingScope::~mbTextEncodingScope() {
+    mbSetUtf8Mode(fMode);
+    gLengthsFromConverter = fLengthsFromConverter;
+    if (fCnv) ExchangeCurrentConverter(fpPrevious);
+}
+
 int mbCharLength(const char* text, size_t n) {
     if (!text || n == 0 || *text == '\0') return 0;
-    if (mbIsUtf8Mode()) {
+    if (mbIsUtf8Mode() || gLengthsFromConverter) {
+        CharCodec codec;
         UChar32 cp;
-        int length = Utf8Next(text, n, &cp);
+        int length = codec.Next(text, n, &cp);
         return length == 0 || cp < 0 ? -1 : length;
     }
     mbstate_t state{};
@@ -389,7 +411,7 @@ void mbCopyPadded(char* dst, size_t size, const char* src, int srcLen) {
     size_t limit = srcLen < 0 ? size : std::min(size, static_cast<size_t>(srcLen));
     size_t n = src ? strnlen(src, limit) : 0;
     size_t run;
-    if (mbIsUtf8Mode()) {
+    if (mbIsUtf8Mode() || gLengthsFromConverter) {
         CharCodec codec;
         run = CodecRun(codec, src, n, false);
     } else {

@@ -14,12 +14,36 @@
 
 #include <cstddef>
 
+#include "codepage.h"
+
 // The interface encoding flag: 0 code-page mode (the state at load), 1 UTF-8.
 int mbIsUtf8Mode();
 void mbSetUtf8Mode(int flag);
 // Changes with every change of the interface encoding or of the current
 // code-page converter, so caches of converted text can tell they are stale.
 unsigned mbGeneration();
+
+// Handles text in another encoding than the interface's until destroyed,
+// then puts the mode and the current converter back: how a file's text is
+// read in the file's own encoding before it is converted.
+class mbTextEncodingScope {
+  public:
+    // UTF-8 mode; the code page stays as it is.
+    mbTextEncodingScope();
+    // Code-page mode in the code page of cnv, which the scope takes over.
+    // Character lengths then come from that converter, not from the
+    // runtime's locale, which need not share its code page.
+    explicit mbTextEncodingScope(ConverterPtr cnv);
+    ~mbTextEncodingScope();
+    mbTextEncodingScope(const mbTextEncodingScope&) = delete;
+    mbTextEncodingScope& operator=(const mbTextEncodingScope&) = delete;
+
+  private:
+    int fMode;
+    bool fLengthsFromConverter;
+    ConverterPtr fCnv;
+    UConverter* fpPrevious = nullptr;
+};
 
 // Byte length of the character at text; 0 for a null or empty text or n = 0,
 // -1 when the bytes do not form a whole character within n bytes.

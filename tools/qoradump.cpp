@@ -1,10 +1,11 @@
 // Prints a system file: its header facts, its dictionary and its cases as
 // CSV, through the public interface of the shared library only.
 //
-//   qoradump [--dict | --cases] [--from N] [--to M] FILE
+//   qoradump [--utf8] [--dict | --cases] [--from N] [--to M] FILE
 //
-// Cases are numbered from 1; --from and --to bound the cases printed, both
-// included. System-missing values print as empty fields; string values lose
+// With --utf8 every text comes in UTF-8, whatever the file's encoding;
+// otherwise in the code page of the locale. Cases are numbered from 1; --from and --to bound the
+// cases printed, both included. System-missing values print as empty fields; string values lose
 // their trailing blanks.
 #include <algorithm>
 #include <charconv>
@@ -118,6 +119,7 @@ void Report(const char* fileName, const Failure& failure) {
 }
 
 struct Options {
+    bool utf8 = false;
     bool dict = true;
     bool cases = true;
     long from = 1;
@@ -135,7 +137,9 @@ bool ParseOptions(int argc, char** argv, Options& options) {
     for (int i = 1; i < argc; ++i) {
         const std::string arg = argv[i];
         const bool hasValue = i + 1 < argc;
-        if (arg == "--dict") {
+        if (arg == "--utf8") {
+            options.utf8 = true;
+        } else if (arg == "--dict") {
             options.cases = false;
         } else if (arg == "--cases") {
             options.dict = false;
@@ -247,6 +251,14 @@ void PrintHeader(int handle, const std::vector<Variable>& variables) {
     else
         std::printf("Cases: %d\n", cases);
     std::printf("Case size: %d bytes\n", caseSize);
+    char encoding[65];
+    int codePage = 0;
+    Check(qoraGetFileEncoding(handle, encoding), "asking for the encoding");
+    std::printf("Encoding: %s\n", encoding);
+    if (qoraGetFileCodePage(handle, &codePage) == QORA_STATUS_OK)
+        std::printf("Code page: %d\n", codePage);
+    else
+        std::printf("Code page: none\n");
     PrintAttributes(handle, nullptr, "");
 }
 
@@ -456,7 +468,8 @@ int main(int argc, char** argv) {
     Options options;
     if (!ParseOptions(argc, argv, options)) {
         std::fprintf(stderr,
-                     "usage: qoradump [--dict | --cases] [--from N] [--to M] FILE\n"
+                     "usage: qoradump [--utf8] [--dict | --cases] [--from N] [--to M] FILE\n"
+                     "  --utf8    show every text in UTF-8 (else in the locale's code page)\n"
                      "  --dict    print the header facts and the dictionary only\n"
                      "  --cases   print the cases only, as CSV\n"
                      "  --from N  start at case N (cases are numbered from 1)\n"
@@ -465,6 +478,7 @@ int main(int argc, char** argv) {
     }
     int handle = -1;
     try {
+        if (options.utf8) Check(qoraSetInterfaceEncoding(1), "choosing UTF-8");
         Check(qoraOpenRead(options.fileName, &handle), "opening the file");
         const std::vector<Variable> variables = Variables(handle);
         if (options.dict) PrintDictionary(handle, variables);

@@ -50,14 +50,7 @@ const QORA_SetFamily kSetFamilies[] = {QORA_SetFamily::kVariableSets,
 void PruneStoredSets(QORA_DataSource& source) {
     for (QORA_SetFamily family : kSetFamilies) {
         QORA_VariableSetList sets = LoadVariableSets(source, family);
-        if (!PruneVariableSets(sets, source)) continue;
-        if (family == QORA_SetFamily::kVariableSets) {
-            source.SetExtensionContent(kVariableSetExtension, 1, 0, nullptr);
-        } else {
-            source.SetExtensionContent(kMultRespExtension, 1, 0, nullptr);
-            source.SetExtensionContent(kExtendedMultRespExtension, 1, 0, nullptr);
-        }
-        StoreVariableSets(source, sets);
+        if (PruneVariableSets(sets, source)) ReplaceVariableSets(source, family, sets);
     }
 }
 

@@ -3,6 +3,7 @@
 #include "SFExtensionEncoding.h"
 
 #include <cstdint>
+#include <string>
 
 #include "HeaderSettings.h"
 #include "SystemFileExtensionRecord.h"
@@ -37,4 +38,11 @@ const bool gRegistered = (RegisterExtensionHandler(kEncodingExtension, gHandler)
 void SetCharacterCodeFromEncoding(HeaderSettings& settings) {
     if (const long codePage = EncodingNameToCodePage(settings.fEncodingName.c_str()))
         settings.fCharacterCode = int32_t(codePage);
+}
+
+std::string FileEncodingName(const HeaderSettings& settings) {
+    if (!settings.fEncodingName.empty()) return settings.fEncodingName;
+    std::string name;
+    if (CodePageToEncodingName(settings.fCharacterCode, name)) return name;
+    return EncodingDisplayName(nullptr);
 }

@@ -2,11 +2,15 @@
 
 #include <algorithm>
 #include <exception>
+#include <optional>
 
 #include "DictionaryReader.h"
 #include "ReaderRepairs.h"
 #include "SFExtensionEncoding.h"
 #include "SaveDS.h"
+#include "TranscodingDataSource.h"
+#include "codepage.h"
+#include "qoramb.h"
 
 namespace {
 
@@ -22,13 +26,22 @@ void NamingFailures(const std::string& fileName, Body body) {
     }
 }
 
+QORA_FileStream::Data::FileName NameRecord(const char* text) {
+    QORA_FileStream::Data::FileName name;
+    name.Set(text);
+    return name;
+}
+
 }  // namespace
 
 SystemFileDataSource::SystemFileDataSource() = default;
 
-SystemFileDataSource::SystemFileDataSource(const char* fileName) {
-    if (!fStream.Open(fileName, "rb")) RaiseError(kErrCannotOpen, fileName);
-    NamingFailures(fileName, [this] { Read(); });
+SystemFileDataSource::SystemFileDataSource(const char* fileName)
+    : SystemFileDataSource(NameRecord(fileName)) {}
+
+SystemFileDataSource::SystemFileDataSource(const QORA_FileStream::Data::FileName& name) {
+    if (!fStream.Open(name, "rb")) RaiseError(kErrCannotOpen, name.InInterfaceEncoding());
+    NamingFailures(name.InInterfaceEncoding(), [this] { Read(); });
 }
 
 SystemFileDataSource::~SystemFileDataSource() {
@@ -111,9 +124,52 @@ void SystemFileDataSource::FinishWriting() {
     fStream.Commit();
 }
 
-std::unique_ptr<QORA_DataSource> OpenForReading(const char* fileName, WarningSink*) {
-    auto source = std::make_unique<SystemFileDataSource>(fileName);
-    // The transcoding wrappers join here: for now the source is returned as
-    // read, in the file's own encoding, and no warning is given.
+namespace {
+
+// The file read a second time with its text handled in its own encoding: the
+// code page of cnv, or UTF-8 when cnv is null. The name stays in the
+// interface encoding.
+std::unique_ptr<SystemFileDataSource> ReadInOwnEncoding(std::unique_ptr<SystemFileDataSource> first,
+                                                        const QORA_FileStream::Data::FileName& name,
+                                                        ConverterPtr cnv) {
+    first.reset();
+    std::optional<mbTextEncodingScope> scope;
+    if (cnv)
+        scope.emplace(std::move(cnv));
+    else
+        scope.emplace();
+    auto source = std::make_unique<SystemFileDataSource>(name);
+    scope.reset();
+    source->SetFileName(name.InInterfaceEncoding());
+    return source;
+}
+
+}  // namespace
+
+std::unique_ptr<QORA_DataSource> OpenForReading(const char* fileName, WarningSink* warnings) {
+    const QORA_FileStream::Data::FileName name = NameRecord(fileName);
+    auto source = std::make_unique<SystemFileDataSource>(name);
+    const std::string encoding = FileEncodingName(source->Settings());
+    const std::string interfaceEncoding = InterfaceEncodingName();
+    if (IsSameEncoding(encoding.c_str(), interfaceEncoding.c_str())) return source;
+    // A locale whose code page is UTF-8 makes a UTF-8 interface in either mode.
+    if (IsSameEncoding(interfaceEncoding.c_str(), "UTF-8")) {
+        // Without a converter there is nothing to read the text with; the
+        // wrapper refuses the name.
+        if (ConverterPtr cnv{OpenConverter(encoding.c_str())})
+            source = ReadInOwnEncoding(std::move(source), name, std::move(cnv));
+        auto wrapper = std::make_unique<UTF8DataSource>(std::move(source), encoding, warnings);
+        // Names cut to their 64 bytes may now repeat one another.
+        RepairNames(*wrapper);
+        return wrapper;
+    }
+    if (IsSameEncoding(encoding.c_str(), "UTF-8")) {
+        source = ReadInOwnEncoding(std::move(source), name, nullptr);
+        auto wrapper =
+            std::make_unique<CodePageDataSource>(std::move(source), interfaceEncoding, warnings);
+        RepairNames(*wrapper);
+        return wrapper;
+    }
+    if (warnings) warnings->Warning(kWarnCodePageShown, encoding);
     return source;
 }

@@ -49,6 +49,8 @@ class SystemFileDataSource : public IndependentDataStore {
     // malformed one 1204 or 1205; the error carries the file name and nests
     // the SystemFileException with the failed condition.
     explicit SystemFileDataSource(const char* fileName);
+    // The same for a name kept in a name record.
+    explicit SystemFileDataSource(const QORA_FileStream::Data::FileName& name);
     // Finishes a file whose cases are being written.
     ~SystemFileDataSource() override;
 
@@ -146,5 +148,7 @@ class SystemFileDataSource::Iterator : public QORA_InputCaseIterator {
 };
 
 // Opens a system file for reading. The name is in the interface encoding;
-// warnings go to the sink when one is given.
+// warnings go to the sink when one is given. A file whose text is in another
+// encoding than the interface's comes converted, through a transcoding data
+// source that owns the file's own source, when one of the two is UTF-8.
 std::unique_ptr<QORA_DataSource> OpenForReading(const char* fileName, WarningSink* warnings);

@@ -241,6 +241,17 @@ void StoreVariableSets(QORA_DataSource& source, const QORA_VariableSetList& sets
     StoreText(source, kExtendedMultRespExtension, extended);
 }
 
+void ReplaceVariableSets(QORA_DataSource& source, QORA_SetFamily family,
+                         const QORA_VariableSetList& sets) {
+    if (family == QORA_SetFamily::kVariableSets) {
+        source.SetExtensionContent(kVariableSetExtension, 1, 0, nullptr);
+    } else {
+        source.SetExtensionContent(kMultRespExtension, 1, 0, nullptr);
+        source.SetExtensionContent(kExtendedMultRespExtension, 1, 0, nullptr);
+    }
+    StoreVariableSets(source, sets);
+}
+
 bool PruneVariableSets(QORA_VariableSetList& sets, const QORA_DataSource& source) {
     if (sets.empty()) return false;
     std::unordered_set<std::string> keys;

@@ -100,6 +100,10 @@ QORA_VariableSetList LoadVariableSets(const QORA_DataSource& source, QORA_SetFam
 // type that receives no line keeps what it held.
 void StoreVariableSets(QORA_DataSource& source, const QORA_VariableSetList& sets);
 
+// Writes the sets of one family in place of every record of that family.
+void ReplaceVariableSets(QORA_DataSource& source, QORA_SetFamily family,
+                         const QORA_VariableSetList& sets);
+
 // Removes member names that name no variable of the data source, then sets
 // left without members. Returns whether anything was removed.
 bool PruneVariableSets(QORA_VariableSetList& sets, const QORA_DataSource& source);

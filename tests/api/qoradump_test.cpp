@@ -114,6 +114,18 @@ TEST(QoraDump, ErrorsNameTheStatusAndExitNonZero) {
     EXPECT_EQ(Dump("").exitCode, 2);
 }
 
+TEST(QoraDump, Utf8ShowsAFileInACodePageConverted) {
+    fixture::SysFileBuilder b;
+    b.String("S", 4).LongName("\xD6\xD0");
+    b.Encoding("GBK").LongNames().Case({"\xD6\xD0"});
+    const DumpResult run = Dump("--utf8 " + b.WriteTemp());
+    EXPECT_EQ(run.exitCode, 0) << run.output;
+    for (const char* line :
+         {"Encoding: GBK\nCode page: 936\n", "1. \xE4\xB8\xAD (string, 12 bytes)",
+          "\n\xE4\xB8\xAD\n\xE4\xB8\xAD\n"})
+        EXPECT_NE(run.output.find(line), std::string::npos) << line;
+}
+
 TEST(QoraDump, AFileWithoutVariablesIsStillAFile) {
     fixture::SysFileBuilder b;
     const DumpResult run = Dump(b.WriteTemp());

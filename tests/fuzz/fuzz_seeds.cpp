@@ -1,10 +1,12 @@
 // Writes the seed corpus of the open-and-read fuzz target into a directory:
 // small files in both byte orders, raw and compressed, that between them use
-// every kind of dictionary record, so the fuzzer starts from deep inside the
-// reader instead of from the magic number.
+// every kind of dictionary record, and files in several encodings, so the
+// fuzzer starts from deep inside the reader instead of from the magic number.
+#include <cstdint>
 #include <cstdio>
 #include <fstream>
 #include <string>
+#include <utility>
 
 #include "sample_file.h"
 #include "sysfile_builder.h"
@@ -58,10 +60,28 @@ Bytes PlainFile(Endian endian, bool compressed) {
     return b.Build();
 }
 
+// A file whose text is in the encoding named: a name and a text given in
+// that encoding's bytes, as a label, value labels, a missing value and a value.
+Bytes EncodedFile(const std::string& encoding, const std::string& name, const std::string& text) {
+    SysFileBuilder b;
+    const std::string value = text.substr(0, 8);
+    b.String("S", 8).LongName(name).Label(text).MissingStrings({value});
+    b.ValueLabels({{value, text}}, {b.Slot("S")});
+    b.LongNames().Encoding(encoding).Case({value});
+    return b.Build();
+}
+
+// Each seed twice: its first byte chooses the interface encoding of the
+// fuzz target, code page (0) or UTF-8 (1).
 bool Write(const std::string& path, const Bytes& bytes) {
-    std::ofstream out(path, std::ios::binary | std::ios::trunc);
-    out.write(reinterpret_cast<const char*>(bytes.data()), std::streamsize(bytes.size()));
-    return out.good();
+    bool ok = true;
+    for (uint8_t mode : {0, 1}) {
+        std::ofstream out(path + "." + std::to_string(mode), std::ios::binary | std::ios::trunc);
+        out.put(char(mode));
+        out.write(reinterpret_cast<const char*>(bytes.data()), std::streamsize(bytes.size()));
+        ok = out.good() && ok;
+    }
+    return ok;
 }
 
 }  // namespace
@@ -82,5 +102,15 @@ int main(int argc, char** argv) {
             ok = Write(dir + "/plain-" + suffix, PlainFile(endian, compressed)) && ok;
         }
     }
+    const std::pair<const char*, Bytes> encoded[] = {
+        {"latin1", EncodedFile("ISO-8859-1", "Gr\xF6\xDF", "Ma\xDF in \xE9t\xE9s")},
+        {"cp1252", EncodedFile("windows-1252", "Preis\x80", "5 \x80 \x84quoted\x93")},
+        {"gbk", EncodedFile("GBK", "\xD0\xD5\xC3\xFB", "\xD6\xD0\xCE\xC4 \xB1\xEA")},
+        {"sjis", EncodedFile("windows-31j", "\x96\xBC\x91\x4F", "\x93\xFA\x96\x7B\x8C\xEA")},
+        {"utf8",
+         EncodedFile("UTF-8", "Gr\xC3\xB6\xC3\x9F", "\xE4\xB8\xAD\xE6\x96\x87 \xE2\x82\xAC")},
+    };
+    for (const auto& [name, bytes] : encoded)
+        ok = Write(dir + "/encoded-" + name + ".qsf", bytes) && ok;
     return ok ? 0 : 1;
 }

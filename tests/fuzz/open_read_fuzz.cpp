@@ -1,5 +1,6 @@
-// Opens arbitrary bytes as a system file through the public calls and reads
-// everything the calls give: every variable's properties and the cases.
+// Opens arbitrary bytes as a system file through the public calls, in either
+// interface encoding, and reads everything the calls give: every variable's
+// properties and the cases.
 // Bad input may be refused with any status; it must never crash, leak or
 // touch memory outside its buffers.
 #include <sys/mman.h>
@@ -91,9 +92,13 @@ void ReadCases(int handle, const std::vector<int>& types) {
 
 }  // namespace
 
+// The first byte chooses the interface encoding (its low bit: UTF-8); the
+// rest is the file, so every file is read raw in one mode and converted in
+// the other whenever its encoding differs from the locale's.
 extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
     static MemoryFile file;
-    const char* path = file.Fill(data, size);
+    if (size == 0 || qoraSetInterfaceEncoding(data[0] & 1) != 0) return 0;
+    const char* path = file.Fill(data + 1, size - 1);
     int handle = -1;
     if (!path || qoraOpenRead(path, &handle) != 0) return 0;
 
