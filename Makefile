@@ -2,7 +2,7 @@
 # rights for the package step): `make run` and `make test`; `make fuzz` and
 # `make bench` for the fuzz run and the benchmarks.
 JOBS ?= $(shell nproc)
-PACKAGES := cmake make g++ clang libclang-rt-14-dev libicu-dev libgtest-dev libgmock-dev libbenchmark-dev locales
+PACKAGES := cmake make g++ clang libclang-rt-14-dev libicu-dev libgtest-dev libgmock-dev libbenchmark-dev locales nlohmann-json3-dev
 SUDO := $(shell [ "$$(id -u)" = 0 ] || echo sudo)
 
 .PHONY: run test deps build build-asan locales bench fuzz clean
