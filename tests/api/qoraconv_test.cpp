@@ -84,12 +84,14 @@ TEST(QoraConv, CsvAndDictionaryComeBackUnchanged) {
     }
 }
 
-TEST(QoraConv, ABareCsvGetsTypesFromItsCellsAndNamesRepaired) {
+TEST(QoraConv, ASpreadsheetCsvGetsTypesFromItsCellsAndNamesRepaired) {
     fixture::TempDir dir;
     const std::string csv = dir.Path() + "/in.csv", out = dir.Path() + "/out.qsf";
-    std::ofstream(csv) << "first name,2nd,Age,age,When,Stamp,with\n"
-                          "Ann,x,31,1.25,2020-01-31,2020-01-31 10:20:30,\n"
-                          "Bob,\"y, z\",,2,2021-02-28,,\n";
+    // As a spreadsheet saves it: a byte order mark and CRLF line ends.
+    std::ofstream(csv) << "\xEF\xBB\xBF"
+                          "first name,2nd,Age,age,When,Stamp,with\r\n"
+                          "Ann,x,31,1.25,2020-01-31,2020-01-31 10:20:30,\r\n"
+                          "Bob,\"y, z\",,2,2021-02-28,,\r\n";
     const fixture::ToolRun run = Conv(csv + " " + out);
     ASSERT_EQ(run.exitCode, 0) << run.output;
     for (const char* notice : {"in.csv line 1: column 1 (\"first name\") is named first_name.\n",

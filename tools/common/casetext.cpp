@@ -14,11 +14,9 @@ namespace {
 std::string DateText(double value, bool withTime) {
     int day = 0, month = 0, year = 0, days = 0, hour = 0, minute = 0;
     double second = 0;
-    if (qoraConvertQORADate(&day, &month, &year, value) != QORA_STATUS_OK ||
-        qoraConvertQORATime(&days, &hour, &minute, &second, value) != QORA_STATUS_OK)
-        return NumberText(value);
+    if (qoraConvertQORADate(&day, &month, &year, value) != QORA_STATUS_OK) return NumberText(value);
     char text[64];
-    if (withTime)
+    if (withTime && qoraConvertQORATime(&days, &hour, &minute, &second, value) == QORA_STATUS_OK)
         std::snprintf(text, sizeof text, "%04d-%02d-%02d %02d:%02d:%02d", year, month, day, hour,
                       minute, int(second));
     else
@@ -35,6 +33,12 @@ bool Digits(std::string_view text, size_t pos, size_t digits, int& out) {
         out = out * 10 + (text[i] - '0');
     }
     return true;
+}
+
+// Says what failed only when a value cannot be read, so that reading costs no
+// text.
+void CheckValue(int status, const Variable& var) {
+    if (status > 0) Check(status, "reading the value of " + var.name);
 }
 
 }  // namespace
@@ -88,16 +92,15 @@ std::string CsvField(const std::string& text) {
 
 std::string ValueText(int handle, int index, const Variable& var, std::vector<char>& buffer) {
     const double varHandle = index + 1;
-    const std::string doing = "reading the value of " + var.name;
     if (var.type == 0) {
         double value = 0;
-        Check(qoraGetValueNumeric(handle, varHandle, &value), doing);
+        CheckValue(qoraGetValueNumeric(handle, varHandle, &value), var);
         if (value == qoraSysmisVal()) return std::string();
         if (IsDateFormat(var.printFormat)) return DateText(value, false);
         if (IsDateTimeFormat(var.printFormat)) return DateText(value, true);
         return NumberText(value);
     }
-    Check(qoraGetValueChar(handle, varHandle, buffer.data(), int(buffer.size())), doing);
+    CheckValue(qoraGetValueChar(handle, varHandle, buffer.data(), int(buffer.size())), var);
     return CsvField(TrimBlanks(buffer.data()));
 }
 

@@ -52,41 +52,59 @@ void CsvReader::Refuse(long line, const std::string& sentence) const {
                    sentence};
 }
 
-void CsvReader::AddByte(std::string& field, int c) {
-    if (field.size() == kWidestCell)
+void CsvReader::Append(std::string& field, const char* bytes, size_t count) {
+    if (count > kWidestCell - field.size())
         Refuse(fLine, "a cell is wider than any string can be (32767 bytes).");
-    field += char(c);
+    field.append(bytes, count);
 }
 
-// A comma, a line end (LF, or CR before LF) or the end of the file.
-bool CsvReader::EndOfField(int c) {
-    return c == ',' || c == '\n' || c == EOF || (c == '\r' && Peek() == '\n');
+int CsvReader::TakeQuoted(std::string& field) {
+    const long quoteLine = fLine;
+    Get();  // the opening quote
+    for (int c = Get();; c = Get()) {
+        if (c == EOF) Refuse(quoteLine, "a quoted cell has no closing quote.");
+        if (c == '"' && (c = Get()) != '"') {
+            if (c == '\r' && Peek() == '\n') c = Get();
+            if (c != ',' && c != '\n' && c != EOF)
+                Refuse(fLine, "a quoted cell goes on after its closing quote.");
+            return c;
+        }
+        if (c == '\n') ++fLine;
+        const char byte = char(c);
+        Append(field, &byte, 1);
+    }
+}
+
+int CsvReader::TakeUnquoted(std::string& field) {
+    for (;;) {
+        const char* start = fBuffer.data() + fPos;
+        const char* end = fBuffer.data() + fEnd;
+        const char* stop = start;
+        while (stop < end && *stop != ',' && *stop != '\n' && *stop != '\r') ++stop;
+        Append(field, start, size_t(stop - start));
+        fPos += size_t(stop - start);
+        if (stop == end) {
+            if (!Refill()) return EOF;
+            continue;
+        }
+        const int c = Get();
+        if (c != '\r') return c;
+        if (Peek() == '\n') return Get();
+        Append(field, "\r", 1);  // a carriage return alone is text
+    }
 }
 
 bool CsvReader::NextRow(std::vector<std::string>& fields) {
-    int c = Get();
-    if (c == EOF) return false;
+    if (Peek() == EOF) return false;
     fRowLine = fLine;
     size_t count = 0;
-    for (;; c = Get()) {
+    int c;
+    do {
         if (count == fields.size()) fields.emplace_back();
         std::string& field = fields[count++];
         field.clear();
-        if (c == '"') {
-            const long quoteLine = fLine;
-            for (c = Get();; c = Get()) {
-                if (c == EOF) Refuse(quoteLine, "a quoted cell has no closing quote.");
-                if (c == '"' && (c = Get()) != '"') break;
-                if (c == '\n') ++fLine;
-                AddByte(field, c);
-            }
-            if (!EndOfField(c)) Refuse(fLine, "a quoted cell goes on after its closing quote.");
-        } else {
-            for (; !EndOfField(c); c = Get()) AddByte(field, c);
-        }
-        if (c == '\r') c = Get();
-        if (c != ',') break;
-    }
+        c = Peek() == '"' ? TakeQuoted(field) : TakeUnquoted(field);
+    } while (c == ',');
     if (c == '\n') ++fLine;
     fields.resize(count);
     return true;

@@ -32,9 +32,12 @@ class CsvReader {
     int Get();
     int Peek();
     bool Refill();
-    bool EndOfField(int c);
+    // Each takes one cell and the byte that ends it: a comma, a line feed
+    // (for LF or CRLF) or EOF.
+    int TakeQuoted(std::string& field);
+    int TakeUnquoted(std::string& field);
+    void Append(std::string& field, const char* bytes, size_t count);
     [[noreturn]] void Refuse(long line, const std::string& sentence) const;
-    void AddByte(std::string& field, int c);
 
     std::string fPath;
     std::FILE* fFile;
