@@ -16,6 +16,7 @@
 #include <vector>
 
 #include "casetext.h"
+#include "dictionary.h"
 #include "dictjson.h"
 #include "formats.h"
 #include "qoraio32.h"
@@ -102,57 +103,33 @@ void PrintFormat(int handle, const Variable& var, const char* what, FormatGetter
 }
 
 void PrintNumericMissing(int handle, const Variable& var) {
-    int count = 0;
-    double values[3];
-    Check(qoraGetVarNMissingValues(handle, var.name.c_str(), &count, &values[0], &values[1],
-                                   &values[2]),
-          "reading the missing values of " + var.name);
+    const NumericMissing missing = NumericMissingValues(handle, var);
+    const int count = missing.count;
     if (count == 0) return;
     std::printf("    missing values:");
     if (count < 0)
-        std::printf(" %s thru %s", NumberText(values[0]).c_str(), NumberText(values[1]).c_str());
+        std::printf(" %s thru %s", NumberText(missing.values[0]).c_str(),
+                    NumberText(missing.values[1]).c_str());
     for (int i = count < 0 ? 2 : 0; i < (count < 0 ? -count : count); ++i)
-        std::printf(" %s", NumberText(values[i]).c_str());
+        std::printf(" %s", NumberText(missing.values[i]).c_str());
     std::printf("\n");
 }
 
 void PrintStringMissing(int handle, const Variable& var) {
-    // The library reports missing values of short strings only.
-    std::vector<char> values[3];
-    for (auto& value : values) value.assign(size_t(var.type) + 1, '\0');
-    int count = 0;
-    const int status = qoraGetVarCMissingValues(handle, var.name.c_str(), &count, values[0].data(),
-                                                values[1].data(), values[2].data());
-    if (status == QORA_STATUS_SHORT_STRING_REQUIRED) return;
-    Check(status, "reading the missing values of " + var.name);
-    if (count == 0) return;
+    const std::vector<std::string> missing = StringMissingValues(handle, var);
+    if (missing.empty()) return;
     std::printf("    missing values:");
-    for (int i = 0; i < count && i < 3; ++i)
-        std::printf(" \"%s\"", TrimBlanks(values[i].data()).c_str());
+    for (const std::string& value : missing) std::printf(" \"%s\"", value.c_str());
     std::printf("\n");
 }
 
 void PrintValueLabels(int handle, const Variable& var) {
-    const std::string doing = "reading the value labels of " + var.name;
-    char** labels = nullptr;
-    int count = 0;
     if (var.type == 0) {
-        double* values = nullptr;
-        if (Check(qoraGetVarNValueLabels(handle, var.name.c_str(), &values, &labels, &count),
-                  doing) != 0)
-            return;
-        for (int i = 0; i < count; ++i)
-            std::printf("    value label: %s = \"%s\"\n", NumberText(values[i]).c_str(), labels[i]);
-        qoraFreeVarNValueLabels(values, labels, count);
+        for (const auto& [value, label] : NumericValueLabels(handle, var))
+            std::printf("    value label: %s = \"%s\"\n", NumberText(value).c_str(), label.c_str());
     } else {
-        char** values = nullptr;
-        if (Check(qoraGetVarCValueLabels(handle, var.name.c_str(), &values, &labels, &count),
-                  doing) != 0)
-            return;
-        for (int i = 0; i < count; ++i)
-            std::printf("    value label: \"%s\" = \"%s\"\n", TrimBlanks(values[i]).c_str(),
-                        labels[i]);
-        qoraFreeVarCValueLabels(values, labels, count);
+        for (const auto& [value, label] : StringValueLabels(handle, var))
+            std::printf("    value label: \"%s\" = \"%s\"\n", value.c_str(), label.c_str());
     }
 }
 

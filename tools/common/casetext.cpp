@@ -43,26 +43,6 @@ void CheckValue(int status, const Variable& var) {
 
 }  // namespace
 
-std::vector<Variable> Variables(int handle) {
-    int count = 0;
-    char** names = nullptr;
-    int* types = nullptr;
-    std::vector<Variable> variables;
-    // The name list refuses a file without variables, which is still a file.
-    if (Check(qoraGetNumberofVariables(handle, &count), "counting the variables") != 0 ||
-        count == 0)
-        return variables;
-    if (Check(qoraGetVarNames(handle, &count, &names, &types), "listing the variables") != 0)
-        return variables;
-    for (int i = 0; i < count; ++i) {
-        int code = 0, decimals = 0, width = 0;
-        qoraGetVarPrintFormat(handle, names[i], &code, &decimals, &width);
-        variables.push_back({names[i], types[i], code});
-    }
-    qoraFreeVarNames(names, types, count);
-    return variables;
-}
-
 bool IsDateFormat(int code) {
     return code == 20 || code == 23 || code == 24 || code == 28 || code == 29 || code == 30 ||
            code == 38 || code == 39;

@@ -7,14 +7,7 @@
 #include <string_view>
 #include <vector>
 
-struct Variable {
-    std::string name;
-    int type;         // 0 numeric, else the string width
-    int printFormat;  // format type code
-};
-
-// The variables of an open file in dictionary order.
-std::vector<Variable> Variables(int handle);
+#include "dictionary.h"
 
 // Print format codes of numbers that hold a date, or a date and a time.
 bool IsDateFormat(int code);

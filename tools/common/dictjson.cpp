@@ -7,6 +7,7 @@
 #include <sstream>
 
 #include "casetext.h"
+#include "dictionary.h"
 #include "formats.h"
 #include "qoraio32.h"
 #include "status.h"
@@ -28,48 +29,23 @@ Format GetFormat(int handle, const Variable& var, FormatGetter get, const char* 
 }
 
 void AddNumericMissing(int handle, const Variable& var, Json& out) {
-    int count = 0;
-    double values[3];
-    Check(qoraGetVarNMissingValues(handle, var.name.c_str(), &count, &values[0], &values[1],
-                                   &values[2]),
-          "reading the missing values of " + var.name);
+    const NumericMissing missing = NumericMissingValues(handle, var);
     Json discrete = Json::array();
-    for (int i = count < 0 ? 2 : 0; i < std::abs(count); ++i) discrete.push_back(values[i]);
+    for (int i = missing.count < 0 ? 2 : 0; i < std::abs(missing.count); ++i)
+        discrete.push_back(missing.values[i]);
     if (!discrete.empty()) out["missingValues"] = discrete;
-    if (count < 0) out["missingRange"] = Json{{"low", values[0]}, {"high", values[1]}};
-}
-
-void AddStringMissing(int handle, const Variable& var, Json& out) {
-    // The library keeps missing values of short strings only.
-    std::vector<char> values[3];
-    for (auto& value : values) value.assign(size_t(var.type) + 1, '\0');
-    int count = 0;
-    const int status = qoraGetVarCMissingValues(handle, var.name.c_str(), &count, values[0].data(),
-                                                values[1].data(), values[2].data());
-    if (status == QORA_STATUS_SHORT_STRING_REQUIRED) return;
-    Check(status, "reading the missing values of " + var.name);
-    Json discrete = Json::array();
-    for (int i = 0; i < count && i < 3; ++i) discrete.push_back(TrimBlanks(values[i].data()));
-    if (!discrete.empty()) out["missingValues"] = discrete;
+    if (missing.count < 0)
+        out["missingRange"] = Json{{"low", missing.values[0]}, {"high", missing.values[1]}};
 }
 
 void AddValueLabels(int handle, const Variable& var, Json& out) {
-    const std::string doing = "reading the value labels of " + var.name;
-    char** labels = nullptr;
-    int count = 0;
     Json pairs = Json::array();
     if (var.type == 0) {
-        double* values = nullptr;
-        Check(qoraGetVarNValueLabels(handle, var.name.c_str(), &values, &labels, &count), doing);
-        for (int i = 0; i < count; ++i)
-            pairs.push_back(Json{{"value", values[i]}, {"label", labels[i]}});
-        qoraFreeVarNValueLabels(values, labels, count);
+        for (const auto& [value, label] : NumericValueLabels(handle, var))
+            pairs.push_back(Json{{"value", value}, {"label", label}});
     } else {
-        char** values = nullptr;
-        Check(qoraGetVarCValueLabels(handle, var.name.c_str(), &values, &labels, &count), doing);
-        for (int i = 0; i < count; ++i)
-            pairs.push_back(Json{{"value", TrimBlanks(values[i])}, {"label", labels[i]}});
-        qoraFreeVarCValueLabels(values, labels, count);
+        for (const auto& [value, label] : StringValueLabels(handle, var))
+            pairs.push_back(Json{{"value", value}, {"label", label}});
     }
     if (!pairs.empty()) out["valueLabels"] = pairs;
 }
@@ -89,8 +65,8 @@ Json VariableJson(int handle, const Variable& var, std::vector<char>& label) {
     if (write != print) out["writeFormat"] = write;
     if (var.type == 0)
         AddNumericMissing(handle, var, out);
-    else
-        AddStringMissing(handle, var, out);
+    else if (const auto missing = StringMissingValues(handle, var); !missing.empty())
+        out["missingValues"] = missing;
     AddValueLabels(handle, var, out);
     int level = 0, alignment = 0, columns = 0;
     Check(qoraGetVarMeasureLevel(handle, name, &level),
