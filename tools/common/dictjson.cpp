@@ -215,14 +215,14 @@ std::vector<SideEntry> ReadSideFile(const std::string& path) {
 }
 
 int SideType(const std::string& path, const SideEntry& entry, int inferred) {
-    const std::string type = entry.spec.value("type", "");
-    if (type.empty()) return inferred;
-    if (type == "numeric") return 0;
-    const int width = entry.spec.value("width", 0);
-    if (type != "string" || width < 1 || width > 32767)
+    const Json& spec = entry.spec;
+    if (!spec.contains("type")) return inferred;
+    if (spec["type"] == "numeric") return 0;
+    const Json width = spec.value("width", Json());
+    if (spec["type"] != "string" || !width.is_number_integer() || width < 1 || width > 32767)
         Refuse(path, entry,
                "the type is \"numeric\", or \"string\" with a width of 1 to 32767 bytes.");
-    return width;
+    return width.get<int>();
 }
 
 void ApplySideEntry(int handle, const std::string& name, int type, const std::string& path,

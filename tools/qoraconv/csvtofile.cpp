@@ -2,6 +2,7 @@
 #include <cctype>
 #include <cstdio>
 #include <set>
+#include <string_view>
 
 #include "casetext.h"
 #include "conversions.h"
