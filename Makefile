@@ -1,14 +1,17 @@
 # Two entry points for a fresh Debian 12 machine (run as root, or with sudo
 # rights for the package step): `make run` and `make test`; `make fuzz` and
-# `make bench` for the fuzz run and the benchmarks.
+# `make bench` for the fuzz run and the benchmarks; `make install` (PREFIX,
+# DESTDIR) installs the library, its header, pkg-config and CMake files and
+# the tools.
 JOBS ?= $(shell nproc)
 PACKAGES := cmake make g++ clang libclang-rt-14-dev libicu-dev libgtest-dev libgmock-dev libbenchmark-dev locales \
-  python3-pandas python3-numpy python3-pytest
+  nlohmann-json3-dev pkgconf python3-pandas python3-numpy python3-pytest
 # Debian's own interpreter, which sees the packages above.
 PYTHON := /usr/bin/python3
+PREFIX ?= /usr/local
 SUDO := $(shell [ "$$(id -u)" = 0 ] || echo sudo)
 
-.PHONY: run test deps build build-asan locales bench fuzz clean
+.PHONY: run test deps build build-asan locales bench fuzz clean install
 
 deps:
 	@missing=$$(for p in $(PACKAGES); do dpkg -s $$p >/dev/null 2>&1 || echo $$p; done); \
@@ -28,6 +31,9 @@ build: deps
 build-asan: deps
 	cmake -S . -B build-asan -DCMAKE_BUILD_TYPE=Debug -DQORA_SANITIZE=ON >/dev/null
 	cmake --build build-asan -j $(JOBS)
+
+install: build
+	DESTDIR=$(DESTDIR) cmake --install build --prefix $(PREFIX)
 
 run: build
 	./build/tools/qoradump examples/sample.qsf

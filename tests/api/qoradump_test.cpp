@@ -1,7 +1,6 @@
 // The dump tool on the example file: its CSV, its dictionary text, its
 // ranges and its error reports, as a user sees them.
 #include <gtest/gtest.h>
-#include <sys/wait.h>
 
 #include <algorithm>
 #include <cctype>
@@ -9,26 +8,15 @@
 #include <fstream>
 #include <string>
 
+#include "run_tool.h"
 #include "sysfile_builder.h"
 
 namespace {
 
-struct DumpResult {
-    int exitCode;
-    std::string output;  // stdout and stderr
-};
+using DumpResult = fixture::ToolRun;
 
 DumpResult Dump(const std::string& arguments) {
-    const std::string command = std::string(QORADUMP_PATH) + " " + arguments + " 2>&1";
-    DumpResult run{-1, {}};
-    std::FILE* pipe = popen(command.c_str(), "r");
-    if (!pipe) return run;
-    char buffer[4096];
-    for (size_t n; (n = std::fread(buffer, 1, sizeof buffer, pipe)) > 0;)
-        run.output.append(buffer, n);
-    const int status = pclose(pipe);
-    run.exitCode = WIFEXITED(status) ? WEXITSTATUS(status) : -1;
-    return run;
+    return fixture::RunTool(std::string(QORADUMP_PATH) + " " + arguments);
 }
 
 const std::string kSample = QORA_EXAMPLES_DIR "/sample.qsf";
@@ -72,9 +60,8 @@ TEST(QoraDump, DictionaryShowsEveryProperty) {
           "    label: Sex of respondent\n", "    missing values: 9\n",
           "    value label: 2 = \"Female\"\n", "    missing values: -99 thru -1\n",
           "4. City (string, 6 bytes)\n", "    missing values: \"NONE\"\n",
-          "    value label: \"LDN\" = \"London\"\n",
-          "    print format: code 20, width 11, 0 decimals\n",
-          "    measurement level 3, alignment 1, column width 8\n",
+          "    value label: \"LDN\" = \"London\"\n", "    print format: DATE11\n",
+          "    measurement level scale, alignment right, column width 8\n",
           "    attribute: Unit = \"points\"\n", "7. CountryOfBirth (string, 20 bytes)\n",
           "    value label: \"France\" = \"Born in France\"\n",
           "8. InterviewerComments (string, 300 bytes)\n"})
