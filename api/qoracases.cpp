@@ -1,6 +1,7 @@
 // The case data calls: reading cases, positioning the reader, single values
 // of the current case, and the special values of the numeric model.
 #include <algorithm>
+#include <cstddef>
 #include <cstring>
 #include <new>
 
@@ -15,11 +16,13 @@ namespace {
 // truncated toward zero), or the status that refuses it.
 int ResolveVariable(const FileEntry& entry, double varHandle, const ValueSlot** slot) {
     const std::vector<ValueSlot>& slots = entry.fValueSlots;
-    if (slots.empty()) return QORA_STATUS_DICT_NOT_COMMITTED;
     // Compared as a double first: NaN and handles beyond int never convert.
-    if (!(varHandle >= 1.0 && varHandle < double(slots.size()) + 1.0))
-        return QORA_STATUS_BAD_VAR_HANDLE;
-    *slot = &slots[size_t(varHandle) - 1];
+    // Signed conversions: the unsigned ones cost a branch each. No handle
+    // passes an empty table, which is told apart only then.
+    const auto count = static_cast<std::ptrdiff_t>(slots.size());
+    if (!(varHandle >= 1.0 && varHandle < double(count + 1)))
+        return slots.empty() ? QORA_STATUS_DICT_NOT_COMMITTED : QORA_STATUS_BAD_VAR_HANDLE;
+    *slot = &slots[std::ptrdiff_t(varHandle) - 1];
     return QORA_STATUS_OK;
 }
 
@@ -30,6 +33,8 @@ char* ValueAt(const FileEntry& entry, const ValueSlot& slot) {
 // Makes sure a case is under construction: the first value of a case starts
 // from the blank case, made once per entry.
 int PrepareCaseOutput(FileEntry& entry) {
+    // Only this function makes a case under construction, after the buffers.
+    if (entry.fCaseState == CaseLoaded) return QORA_STATUS_OK;
     const size_t bytes = 8 * size_t(entry.fpDataSource->ValueCount());
     if (!entry.fpCaseBuffer) {
         const size_t units = std::max<size_t>(bytes / 8, 1);
@@ -43,10 +48,8 @@ int PrepareCaseOutput(FileEntry& entry) {
                                         entry.fpDataSource->ColumnCount());
         entry.fCaseState = CaseNone;
     }
-    if (entry.fCaseState != CaseLoaded) {
-        std::memcpy(entry.fpCaseBuffer.get(), entry.fpBlankCase.get(), bytes);
-        entry.fCaseState = CaseLoaded;
-    }
+    std::memcpy(entry.fpCaseBuffer.get(), entry.fpBlankCase.get(), bytes);
+    entry.fCaseState = CaseLoaded;
     return QORA_STATUS_OK;
 }
 
