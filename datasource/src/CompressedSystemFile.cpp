@@ -28,6 +28,18 @@ struct CodeTable {
 };
 const CodeTable kCodes;
 
+// Eight control bytes read as one word, so that a block is judged at once.
+constexpr uint64_t kEachByte = 0x0101010101010101ull;
+constexpr uint64_t kLow7 = 0x7F7F7F7F7F7F7F7Full;
+
+// 0x80 in each byte of codes that equals code, 0 in every other byte.
+uint64_t BytesEqual(uint64_t codes, unsigned char code) {
+    const uint64_t x = codes ^ (kEachByte * code);
+    return ~(((x & kLow7) + kLow7) | x) & ~kLow7;
+}
+
+uint32_t CountBytes(uint64_t marks) { return uint32_t(((marks >> 7) * kEachByte) >> 56); }
+
 [[noreturn]] void TooShort(const char* condition, int line) {
     throw SystemFileException(kErrTooShort, condition, __FILE__, line);
 }
@@ -55,24 +67,26 @@ CompressedSystemFile::~CompressedSystemFile() {
     }
 }
 
+// Whatever the unit holds, the steps are the same: no branch to mispredict
+// on mixed data. Only a whole number from -99 to 151 equals the table entry
+// of its truncated value; 0.5, -0.0, NaN and text units never do.
 unsigned char CompressedSystemFile::Encode(const unsigned char* unit) {
     uint64_t bits;
     std::memcpy(&bits, unit, 8);
-    if (bits == kSysmisBits) return kSysmis;
-    if (bits == kBlankBits) return kBlank;
-    const uint32_t low = static_cast<uint32_t>(bits);
-    const uint32_t high = static_cast<uint32_t>(bits >> 32);
-    const uint32_t exponent = high & 0x7FF00000u;
-    // Only 0.0 and whole numbers of magnitude 1 to 255 can have a code.
-    if (low != 0 || (high != 0 && (exponent < 0x3FF00000u || exponent > 0x40600000u))) {
-        return kRaw;
-    }
     double value;
     std::memcpy(&value, unit, 8);
-    const int k = static_cast<int>(value) + kBias;
-    if (k < 1 || k >= kEndOfBlock) return kRaw;
-    if (std::memcmp(kCodes.unit[k], unit, 8) != 0) return kRaw;
-    return static_cast<unsigned char>(k);
+    // Clamped to the codes 0 to 252 first, so that the conversion is defined
+    // for any bits; the ends themselves are no number's code.
+    constexpr double kLowest = -double(kBias), kHighest = double(kEndOfBlock - kBias);
+    double clamped = value >= kLowest ? value : kLowest;
+    clamped = clamped <= kHighest ? clamped : kHighest;
+    const unsigned k = static_cast<unsigned>(static_cast<int>(clamped) + kBias);
+    uint64_t entry;
+    std::memcpy(&entry, kCodes.unit[k], 8);
+    const bool coded = k - 1 < kEndOfBlock - 1 && entry == bits;
+    unsigned code = coded ? k : unsigned{kRaw};
+    code = bits == kBlankBits ? unsigned{kBlank} : code;
+    return static_cast<unsigned char>(bits == kSysmisBits ? unsigned{kSysmis} : code);
 }
 
 bool CompressedSystemFile::Fill(uint32_t need) {
@@ -106,10 +120,18 @@ bool CompressedSystemFile::LoadBlock() {
         return false;
     }
     const unsigned char* control = fAhead.get() + fAheadBegin;
-    uint32_t raws = 0;
-    for (uint32_t i = 0; i < kKeySize && control[i] != kEndOfBlock; ++i) {
-        raws += control[i] == kRaw;
+    uint64_t codes;
+    std::memcpy(&codes, control, kKeySize);
+    const bool ends = BytesEqual(codes, kEndOfBlock) != 0;
+    uint32_t raws = CountBytes(BytesEqual(codes, kRaw));
+    if (ends) {
+        raws = 0;
+        for (uint32_t i = 0; i < kKeySize && control[i] != kEndOfBlock; ++i) {
+            raws += control[i] == kRaw;
+        }
     }
+    // Every code fills a cell: the block can be decoded without a branch per code.
+    fFullBlock = !ends && BytesEqual(codes, kSkip) == 0;
     const uint32_t length = kKeySize + kUnitSize * raws;
     if (!Fill(length)) TooShort("nRead == nu*sizeof(OBS)", __LINE__);
     fControl = fAhead.get() + fAheadBegin;
@@ -122,6 +144,16 @@ bool CompressedSystemFile::LoadBlock() {
     return true;
 }
 
+void CompressedSystemFile::DecodeFullBlock(unsigned char* out) const {
+    const unsigned char* raw = fControl + kKeySize;
+    for (uint32_t i = 0; i < kKeySize; ++i, out += kUnitSize) {
+        const unsigned char code = fControl[i];
+        const bool isRaw = code == kRaw;
+        std::memcpy(out, isRaw ? raw : kCodes.unit[code], kUnitSize);
+        raw += isRaw ? size_t{kUnitSize} : 0;
+    }
+}
+
 template <bool kStore>
 uint32_t CompressedSystemFile::Decode(unsigned char* out, const unsigned char* swapMask) {
     const uint32_t n = fUnits;
@@ -131,6 +163,14 @@ uint32_t CompressedSystemFile::Decode(unsigned char* out, const unsigned char* s
         if (fPos >= kKeySize && !LoadBlock()) {
             if (cell == 0) return 0;
             TooShort("iCell == 0", __LINE__);
+        }
+        if (fFullBlock && fPos == 0 && n - cell >= kKeySize && !(kStore && swapMask)) {
+            if (kStore) DecodeFullBlock(out + kUnitSize * cell);
+            fRawNext = fControl + (fNextBlock - fBlockStart);
+            fPos = kKeySize;
+            cell += kKeySize;
+            if (cell == n) return n;
+            continue;
         }
         const unsigned char* control = fControl;
         const unsigned char* raw = fRawNext;
@@ -228,17 +268,33 @@ uint32_t CompressedSystemFile::ReadCase(void* units, const unsigned char* swapMa
     return n;
 }
 
-void CompressedSystemFile::WriteBlock() {
-    const uint32_t length = kKeySize + kUnitSize * fRawCount;
-    if (fStream->Seek(fDataStart + fBlockStart, 0) != 0 ||
-        fStream->Write(fBlock, length) != length) {
+void CompressedSystemFile::WritePending() {
+    if (fPendingLength == 0) return;
+    if (fStream->Seek(fDataStart + fPendingStart, 0) != 0 ||
+        fStream->Write(fPending.get(), fPendingLength) != fPendingLength) {
         RaiseError(kErrStreamWrite, "compressed case data");
     }
+    fPendingLength = 0;
+}
+
+// Blocks that follow each other in the file are collected and written
+// together; a block written again (the last one, after a finish) starts anew.
+void CompressedSystemFile::WriteBlock() {
+    const uint32_t length = kKeySize + kUnitSize * fRawCount;
+    if (fBlockStart != fPendingStart + fPendingLength || fPendingLength + length > kPendingSize) {
+        WritePending();
+        fPendingStart = fBlockStart;
+    }
+    if (!fPending) fPending.reset(new unsigned char[kPendingSize]);
+    std::memcpy(fPending.get() + fPendingLength, fBlock, length);
+    fPendingLength += length;
     fNextBlock = fBlockStart + length;
     fAheadStart = fNextBlock;
     fAheadBegin = fAheadEnd = 0;
 }
 
+// Every unit is copied to the next raw slot, which only a raw code keeps:
+// the slot is free again for the next unit otherwise.
 void CompressedSystemFile::WriteCase(const void* units) {
     fIndex->Offer(fCurrent, Tell());
     const unsigned char* unit = static_cast<const unsigned char*>(units);
@@ -250,7 +306,8 @@ void CompressedSystemFile::WriteCase(const void* units) {
         }
         const unsigned char code = Encode(unit);
         fBlock[fPos++] = code;
-        if (code == kRaw) std::memcpy(fBlock + kKeySize + kUnitSize * fRawCount++, unit, kUnitSize);
+        std::memcpy(fBlock + kKeySize + kUnitSize * fRawCount, unit, kUnitSize);
+        fRawCount += code == kRaw;
         if (fPos == kKeySize) WriteBlock();
     }
     ++fCurrent;
@@ -263,6 +320,7 @@ void CompressedSystemFile::Finish() {
         std::memset(fBlock + fPos, kSkip, kKeySize - fPos);
         WriteBlock();
     }
+    WritePending();
     if (fFile) fFile->Flush();
     fWritten = false;
 }

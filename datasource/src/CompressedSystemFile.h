@@ -2,7 +2,8 @@
 //
 // Cells are coded in blocks of 8 control bytes, each followed by the raw
 // values its code 253 cells need. Reading decodes whole blocks from a
-// read-ahead buffer; writing collects one block and writes it when full.
+// read-ahead buffer; writing collects blocks and hands them to the stream
+// in large writes.
 #pragma once
 
 #include <cstdint>
@@ -58,15 +59,22 @@ class CompressedSystemFile {
     static unsigned char Encode(const unsigned char* unit);
 
   private:
-    enum : uint32_t { kReadAhead = 64 * 1024, kBlockSize = kKeySize * (1 + kUnitSize) };
+    enum : uint32_t {
+        kReadAhead = 64 * 1024,
+        kBlockSize = kKeySize * (1 + kUnitSize),
+        kPendingSize = 64 * 1024,
+    };
 
     void Position();
     template <bool kStore>
     uint32_t Decode(unsigned char* out, const unsigned char* swapMask);
     bool LoadBlock();
+    // The loaded block, all of whose codes fill cells, into 8 units.
+    void DecodeFullBlock(unsigned char* out) const;
     bool Fill(uint32_t need);
     void DropReadAhead(int64_t position);
     void WriteBlock();
+    void WritePending();
 
     int64_t fCurrent = 0;
     int64_t fRequested = 0;
@@ -93,8 +101,14 @@ class CompressedSystemFile {
     uint32_t fAheadEnd = 0;
     const unsigned char* fControl = nullptr;
     const unsigned char* fRawNext = nullptr;
+    bool fFullBlock = false;  // no code 0 or 252 in the loaded block
 
     // Writing: control bytes, then room for one raw value per control byte.
     unsigned char fBlock[kBlockSize] = {};
     uint32_t fRawCount = 0;
+    // Written blocks not yet handed to the stream: the compressed bytes from
+    // fPendingStart on. Made at the first block written.
+    std::unique_ptr<unsigned char[]> fPending;
+    int64_t fPendingStart = 0;
+    uint32_t fPendingLength = 0;
 };
