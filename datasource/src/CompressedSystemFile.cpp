@@ -53,7 +53,8 @@ CompressedSystemFile::CompressedSystemFile(uint32_t unitsPerCase, SparseFileInde
       fStream(stream),
       fFile(dynamic_cast<QORA_FileStream*>(stream)),
       fUnits(unitsPerCase),
-      fAhead(new unsigned char[kReadAhead]) {
+      fAhead(new unsigned char[kReadAhead]),
+      fPending(*stream) {
     QORA_ASSERT(index != nullptr);
     QORA_ASSERT(stream != nullptr);
     fStream->Seek(fDataStart, 0);
@@ -268,26 +269,10 @@ uint32_t CompressedSystemFile::ReadCase(void* units, const unsigned char* swapMa
     return n;
 }
 
-void CompressedSystemFile::WritePending() {
-    if (fPendingLength == 0) return;
-    if (fStream->Seek(fDataStart + fPendingStart, 0) != 0 ||
-        fStream->Write(fPending.get(), fPendingLength) != fPendingLength) {
-        RaiseError(kErrStreamWrite, "compressed case data");
-    }
-    fPendingLength = 0;
-}
-
-// Blocks that follow each other in the file are collected and written
-// together; a block written again (the last one, after a finish) starts anew.
 void CompressedSystemFile::WriteBlock() {
     const uint32_t length = kKeySize + kUnitSize * fRawCount;
-    if (fBlockStart != fPendingStart + fPendingLength || fPendingLength + length > kPendingSize) {
-        WritePending();
-        fPendingStart = fBlockStart;
-    }
-    if (!fPending) fPending.reset(new unsigned char[kPendingSize]);
-    std::memcpy(fPending.get() + fPendingLength, fBlock, length);
-    fPendingLength += length;
+    if (!fPending.Put(fDataStart + fBlockStart, fBlock, length))
+        RaiseError(kErrStreamWrite, "compressed case data");
     fNextBlock = fBlockStart + length;
     fAheadStart = fNextBlock;
     fAheadBegin = fAheadEnd = 0;
@@ -320,7 +305,7 @@ void CompressedSystemFile::Finish() {
         std::memset(fBlock + fPos, kSkip, kKeySize - fPos);
         WriteBlock();
     }
-    WritePending();
+    if (!fPending.Flush()) RaiseError(kErrStreamWrite, "compressed case data");
     if (fFile) fFile->Flush();
     fWritten = false;
 }

@@ -9,6 +9,8 @@
 #include <cstdint>
 #include <memory>
 
+#include "writebehind.h"
+
 class QORA_StrBaseIO;
 class QORA_FileStream;
 class SparseFileIndex;
@@ -59,11 +61,7 @@ class CompressedSystemFile {
     static unsigned char Encode(const unsigned char* unit);
 
   private:
-    enum : uint32_t {
-        kReadAhead = 64 * 1024,
-        kBlockSize = kKeySize * (1 + kUnitSize),
-        kPendingSize = 64 * 1024,
-    };
+    enum : uint32_t { kReadAhead = 64 * 1024, kBlockSize = kKeySize * (1 + kUnitSize) };
 
     void Position();
     template <bool kStore>
@@ -74,7 +72,6 @@ class CompressedSystemFile {
     bool Fill(uint32_t need);
     void DropReadAhead(int64_t position);
     void WriteBlock();
-    void WritePending();
 
     int64_t fCurrent = 0;
     int64_t fRequested = 0;
@@ -106,9 +103,7 @@ class CompressedSystemFile {
     // Writing: control bytes, then room for one raw value per control byte.
     unsigned char fBlock[kBlockSize] = {};
     uint32_t fRawCount = 0;
-    // Written blocks not yet handed to the stream: the compressed bytes from
-    // fPendingStart on. Made at the first block written.
-    std::unique_ptr<unsigned char[]> fPending;
-    int64_t fPendingStart = 0;
-    uint32_t fPendingLength = 0;
+    // Written blocks not yet handed to the stream; a block written again
+    // (the last one, continued after a finish) starts a new collection.
+    WriteBehind fPending;
 };
