@@ -68,26 +68,24 @@ CompressedSystemFile::~CompressedSystemFile() {
     }
 }
 
-// Whatever the unit holds, the steps are the same: no branch to mispredict
-// on mixed data. Only a whole number from -99 to 151 equals the table entry
-// of its truncated value; 0.5, -0.0, NaN and text units never do.
 unsigned char CompressedSystemFile::Encode(const unsigned char* unit) {
     uint64_t bits;
     std::memcpy(&bits, unit, 8);
+    if (bits == kSysmisBits) return kSysmis;
+    if (bits == kBlankBits) return kBlank;
+    const uint32_t low = static_cast<uint32_t>(bits);
+    const uint32_t high = static_cast<uint32_t>(bits >> 32);
+    const uint32_t exponent = high & 0x7FF00000u;
+    // Only 0.0 and whole numbers of magnitude 1 to 255 can have a code.
+    if (low != 0 || (high != 0 && (exponent < 0x3FF00000u || exponent > 0x40600000u))) {
+        return kRaw;
+    }
     double value;
     std::memcpy(&value, unit, 8);
-    // Clamped to the codes 0 to 252 first, so that the conversion is defined
-    // for any bits; the ends themselves are no number's code.
-    constexpr double kLowest = -double(kBias), kHighest = double(kEndOfBlock - kBias);
-    double clamped = value >= kLowest ? value : kLowest;
-    clamped = clamped <= kHighest ? clamped : kHighest;
-    const unsigned k = static_cast<unsigned>(static_cast<int>(clamped) + kBias);
-    uint64_t entry;
-    std::memcpy(&entry, kCodes.unit[k], 8);
-    const bool coded = k - 1 < kEndOfBlock - 1 && entry == bits;
-    unsigned code = coded ? k : unsigned{kRaw};
-    code = bits == kBlankBits ? unsigned{kBlank} : code;
-    return static_cast<unsigned char>(bits == kSysmisBits ? unsigned{kSysmis} : code);
+    const int k = static_cast<int>(value) + kBias;
+    if (k < 1 || k >= kEndOfBlock) return kRaw;
+    if (std::memcmp(kCodes.unit[k], unit, 8) != 0) return kRaw;
+    return static_cast<unsigned char>(k);
 }
 
 bool CompressedSystemFile::Fill(uint32_t need) {
@@ -279,22 +277,30 @@ void CompressedSystemFile::WriteBlock() {
 }
 
 // Every unit is copied to the next raw slot, which only a raw code keeps:
-// the slot is free again for the next unit otherwise.
+// the slot is free again for the next unit otherwise. The block's counters
+// stay in locals between the blocks written.
 void CompressedSystemFile::WriteCase(const void* units) {
     fIndex->Offer(fCurrent, Tell());
     const unsigned char* unit = static_cast<const unsigned char*>(units);
-    for (uint32_t u = 0; u < fUnits; ++u, unit += kUnitSize) {
-        if (fPos >= kKeySize) {
+    const unsigned char* const end = unit + size_t{kUnitSize} * fUnits;
+    uint32_t pos = fPos, raws = fRawCount;
+    for (; unit != end; unit += kUnitSize) {
+        if (pos >= kKeySize) {
             fBlockStart = fNextBlock;
-            fPos = 0;
-            fRawCount = 0;
+            pos = raws = 0;
         }
         const unsigned char code = Encode(unit);
-        fBlock[fPos++] = code;
-        std::memcpy(fBlock + kKeySize + kUnitSize * fRawCount, unit, kUnitSize);
-        fRawCount += code == kRaw;
-        if (fPos == kKeySize) WriteBlock();
+        fBlock[pos++] = code;
+        std::memcpy(fBlock + kKeySize + kUnitSize * raws, unit, kUnitSize);
+        raws += code == kRaw;
+        if (pos == kKeySize) {
+            fPos = pos;
+            fRawCount = raws;
+            WriteBlock();
+        }
     }
+    fPos = pos;
+    fRawCount = raws;
     ++fCurrent;
     fWritten = true;
 }
