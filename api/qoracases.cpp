@@ -30,11 +30,8 @@ char* ValueAt(const FileEntry& entry, const ValueSlot& slot) {
     return reinterpret_cast<char*>(entry.fpCaseBuffer.get()) + size_t(slot.offset) * 8;
 }
 
-// Makes sure a case is under construction: the first value of a case starts
-// from the blank case, made once per entry.
-int PrepareCaseOutput(FileEntry& entry) {
-    // Only this function makes a case under construction, after the buffers.
-    if (entry.fCaseState == CaseLoaded) return QORA_STATUS_OK;
+// Starts a case from the blank case, made once per entry.
+int StartCase(FileEntry& entry) {
     const size_t bytes = 8 * size_t(entry.fpDataSource->ValueCount());
     if (!entry.fpCaseBuffer) {
         const size_t units = std::max<size_t>(bytes / 8, 1);
@@ -51,6 +48,13 @@ int PrepareCaseOutput(FileEntry& entry) {
     std::memcpy(entry.fpCaseBuffer.get(), entry.fpBlankCase.get(), bytes);
     entry.fCaseState = CaseLoaded;
     return QORA_STATUS_OK;
+}
+
+// Makes sure a case is under construction. On a writing handle only
+// StartCase makes one, after the buffers, so a loaded case needs nothing
+// more; the test is all that stays in the calls that set values.
+inline int PrepareCaseOutput(FileEntry& entry) {
+    return entry.fCaseState == CaseLoaded ? int(QORA_STATUS_OK) : StartCase(entry);
 }
 
 // Prepares the case and resolves the variable: the value's place, or a status.
