@@ -1,7 +1,7 @@
 // Writing ~200 MB of numeric cases through the exported calls, beside the
 // baseline of writing the same bytes with write() to the same directory, in
 // chunks of the stream's buffer (4 KiB) and of the library's writes of case
-// data (64 KiB). Figures are bytes of case data per
+// data (128 KiB). Figures are bytes of case data per
 // second, so each can be given as a ratio to the baseline. Each iteration
 // writes a new file; removing it is left out of the timing.
 #include <benchmark/benchmark.h>
@@ -19,7 +19,7 @@
 namespace {
 
 constexpr int64_t kPoolCases = 4096;
-constexpr size_t kChunk = 64 * 1024;  // WriteBehind::kSize, the writes of case data
+constexpr size_t kChunk = 128 * 1024;  // WriteBehind::kSize, the writes of case data
 
 // Cases cycled through by every benchmark: mostly whole numbers 1 to 150,
 // which compress to a code byte (the code is the number plus 100 and must

@@ -10,7 +10,9 @@ class QORA_StrBaseIO;
 
 class WriteBehind {
   public:
-    enum : uint32_t { kSize = 64 * 1024 };
+    // Writes cover whole, aligned stretches of kAlign bytes where they can;
+    // the collection holds two of them.
+    enum : uint32_t { kAlign = 64 * 1024, kSize = 2 * kAlign };
 
     explicit WriteBehind(QORA_StrBaseIO& stream) : fStream(stream) {}
 
@@ -25,6 +27,10 @@ class WriteBehind {
     bool Flush();
 
   private:
+    bool WriteWholeStretches();
+    // Writes the first length bytes collected at their place.
+    bool Write(uint32_t length);
+
     QORA_StrBaseIO& fStream;
     std::unique_ptr<unsigned char[]> fBuffer;  // made at the first Put
     int64_t fStart = 0;
