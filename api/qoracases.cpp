@@ -1,6 +1,7 @@
 // The case data calls: reading cases, positioning the reader, single values
 // of the current case, and the special values of the numeric model.
 #include <algorithm>
+#include <cstddef>
 #include <cstring>
 #include <new>
 
@@ -15,11 +16,13 @@ namespace {
 // truncated toward zero), or the status that refuses it.
 int ResolveVariable(const FileEntry& entry, double varHandle, const ValueSlot** slot) {
     const std::vector<ValueSlot>& slots = entry.fValueSlots;
-    if (slots.empty()) return QORA_STATUS_DICT_NOT_COMMITTED;
     // Compared as a double first: NaN and handles beyond int never convert.
-    if (!(varHandle >= 1.0 && varHandle < double(slots.size()) + 1.0))
-        return QORA_STATUS_BAD_VAR_HANDLE;
-    *slot = &slots[size_t(varHandle) - 1];
+    // Signed conversions: the unsigned ones cost a branch each. No handle
+    // passes an empty table, which is told apart only then.
+    const auto count = static_cast<std::ptrdiff_t>(slots.size());
+    if (!(varHandle >= 1.0 && varHandle < double(count + 1)))
+        return slots.empty() ? QORA_STATUS_DICT_NOT_COMMITTED : QORA_STATUS_BAD_VAR_HANDLE;
+    *slot = &slots[std::ptrdiff_t(varHandle) - 1];
     return QORA_STATUS_OK;
 }
 
@@ -27,9 +30,8 @@ char* ValueAt(const FileEntry& entry, const ValueSlot& slot) {
     return reinterpret_cast<char*>(entry.fpCaseBuffer.get()) + size_t(slot.offset) * 8;
 }
 
-// Makes sure a case is under construction: the first value of a case starts
-// from the blank case, made once per entry.
-int PrepareCaseOutput(FileEntry& entry) {
+// Starts a case from the blank case, made once per entry.
+int StartCase(FileEntry& entry) {
     const size_t bytes = 8 * size_t(entry.fpDataSource->ValueCount());
     if (!entry.fpCaseBuffer) {
         const size_t units = std::max<size_t>(bytes / 8, 1);
@@ -43,11 +45,16 @@ int PrepareCaseOutput(FileEntry& entry) {
                                         entry.fpDataSource->ColumnCount());
         entry.fCaseState = CaseNone;
     }
-    if (entry.fCaseState != CaseLoaded) {
-        std::memcpy(entry.fpCaseBuffer.get(), entry.fpBlankCase.get(), bytes);
-        entry.fCaseState = CaseLoaded;
-    }
+    std::memcpy(entry.fpCaseBuffer.get(), entry.fpBlankCase.get(), bytes);
+    entry.fCaseState = CaseLoaded;
     return QORA_STATUS_OK;
+}
+
+// Makes sure a case is under construction. On a writing handle only
+// StartCase makes one, after the buffers, so a loaded case needs nothing
+// more; the test is all that stays in the calls that set values.
+inline int PrepareCaseOutput(FileEntry& entry) {
+    return entry.fCaseState == CaseLoaded ? int(QORA_STATUS_OK) : StartCase(entry);
 }
 
 // Prepares the case and resolves the variable: the value's place, or a status.

@@ -15,15 +15,19 @@ struct UserLocale {
 };
 
 const UserLocale gUserLocale;
+
+}  // namespace
+
 HandleTable gHandleTable;
+
+namespace {
+
 const SpecialValues gSpecialValues;
 // The month abbreviations are constant data of the library image. The
 // extension record handlers register themselves as their objects are made,
 // and the lock of the locale lookup is made beside that lookup.
 
 }  // namespace
-
-HandleTable& TheHandleTable() { return gHandleTable; }
 
 double SysmisValue() { return gSpecialValues.fSysmis; }
 double LowestValue() { return gSpecialValues.fLowest; }

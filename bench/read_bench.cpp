@@ -17,9 +17,11 @@
 #include <filesystem>
 #include <stdexcept>
 #include <string>
+#include <thread>
 #include <vector>
 
 #include "bench_files.h"
+#include "bench_report.h"
 #include "qoraio32.h"
 
 namespace {
@@ -98,6 +100,7 @@ void WriteCompressedCases(Writer& out) {
 }
 
 std::string gRawPath, gCompressedPath;
+int64_t gRawDataStart = 0;  // where the raw file's cases begin
 
 std::string WriteFile(const std::string& dir, bool compressed) {
     const std::string path = dir + (compressed ? "/compressed.qsf" : "/raw.qsf");
@@ -127,6 +130,58 @@ void ReadBaseline(benchmark::State& state) {
     state.SetBytesProcessed(bytes);
 }
 
+// The floor of a call that hands out one case at a time: read() into a
+// read-ahead buffer of the library's size, then one copy per case into the
+// caller's record. Reads the cases from first up to the end of the file or
+// count of them; returns the bytes copied.
+int64_t FloorRead(int64_t first, int64_t count) {
+    constexpr size_t kReadAhead = 256 * 1024;  // the case iterator's read-ahead
+    constexpr size_t kRecordBytes = kVariables * 8;
+    std::vector<char> ahead(kReadAhead);
+    std::vector<double> record(kVariables);
+    const int fd = open(gRawPath.c_str(), O_RDONLY);
+    lseek(fd, gRawDataStart + first * int64_t{kRecordBytes}, SEEK_SET);
+    int64_t bytes = 0;
+    size_t begin = 0, end = 0;
+    for (int64_t c = 0; c < count;) {
+        if (end - begin < kRecordBytes) {
+            std::memmove(ahead.data(), ahead.data() + begin, end - begin);
+            end -= begin;
+            begin = 0;
+            const ssize_t n = read(fd, ahead.data() + end, kReadAhead - end);
+            if (n <= 0) break;
+            end += size_t(n);
+            continue;
+        }
+        std::memcpy(record.data(), ahead.data() + begin, kRecordBytes);
+        benchmark::DoNotOptimize(record.data());
+        begin += kRecordBytes;
+        bytes += kRecordBytes;
+        ++c;
+    }
+    close(fd);
+    return bytes;
+}
+
+void ReadFloor(benchmark::State& state) {
+    int64_t bytes = 0;
+    for (auto _ : state) bytes += FloorRead(0, kCases);
+    state.SetBytesProcessed(bytes);
+}
+
+// The floor of two readers: each half of the cases in a thread of its own.
+void ParallelReadFloor(benchmark::State& state) {
+    int64_t bytes = 0;
+    for (auto _ : state) {
+        int64_t otherBytes = 0;
+        std::thread other([&otherBytes] { otherBytes = FloorRead(kCases / 2, kCases); });
+        bytes += FloorRead(0, kCases / 2);
+        other.join();
+        bytes += otherBytes;
+    }
+    state.SetBytesProcessed(bytes);
+}
+
 int OpenOrSkip(benchmark::State& state) {
     int handle = -1;
     const int status = qoraOpenRead(PathOf(state).c_str(), &handle);
@@ -149,18 +204,43 @@ void WholeCaseIn(benchmark::State& state) {
     state.counters["cases_read"] = double(cases) / double(state.iterations());
 }
 
+// Reads count cases through the handle into a record of its own.
+void ReadCases(int handle, int64_t count) {
+    std::vector<double> record(kVariables);
+    for (int64_t c = 0; c < count && qoraWholeCaseIn(handle, record.data()) == QORA_STATUS_OK; ++c)
+        benchmark::DoNotOptimize(record.data());
+}
+
+// Two handles on one file, opened and closed in turn, each reading half of
+// the cases in a thread of its own.
+void ParallelWholeCaseIn(benchmark::State& state) {
+    for (auto _ : state) {
+        const int first = OpenOrSkip(state);
+        const int second = OpenOrSkip(state);
+        if (first < 0 || second < 0) break;
+        qoraSeekNextCase(second, int(kCases / 2));
+        std::thread other(ReadCases, second, kCases - kCases / 2);
+        ReadCases(first, kCases / 2);
+        other.join();
+        qoraCloseRead(second);
+        qoraCloseRead(first);
+    }
+    state.SetBytesProcessed(state.iterations() * kCaseBytes);
+}
+
+// The values of a case are fetched into an array and summed after the case:
+// a running sum kept across the calls would live in memory (no register
+// survives a call) and chain every value to the one before it.
 void ReadCaseRecordValues(benchmark::State& state) {
     int64_t values = 0;
     double sum = 0;
+    std::vector<double> record(kVariables);
     for (auto _ : state) {
         const int handle = OpenOrSkip(state);
         if (handle < 0) break;
         while (qoraReadCaseRecord(handle) == QORA_STATUS_OK) {
-            for (int v = 1; v <= kVariables; ++v) {
-                double value;
-                qoraGetValueNumeric(handle, v, &value);
-                sum += value;
-            }
+            for (int v = 1; v <= kVariables; ++v) qoraGetValueNumeric(handle, v, &record[v - 1]);
+            for (double value : record) sum += value;
             values += kVariables;
         }
         qoraCloseRead(handle);
@@ -177,7 +257,10 @@ void FileArgs(benchmark::internal::Benchmark* b) {
 }
 
 BENCHMARK(ReadBaseline)->Apply(FileArgs);
+BENCHMARK(ReadFloor)->Unit(benchmark::kMillisecond)->UseRealTime();
+BENCHMARK(ParallelReadFloor)->Unit(benchmark::kMillisecond)->UseRealTime();
 BENCHMARK(WholeCaseIn)->Apply(FileArgs);
+BENCHMARK(ParallelWholeCaseIn)->Apply(FileArgs);
 BENCHMARK(ReadCaseRecordValues)->Apply(FileArgs);
 
 }  // namespace
@@ -191,11 +274,14 @@ int main(int argc, char** argv) {
     int result = 0;
     try {
         gRawPath = WriteFile(dir, false);
+        gRawDataStart = std::filesystem::file_size(gRawPath) - kCaseBytes;
         gCompressedPath = WriteFile(dir, true);
         std::fprintf(stderr, "case data: %lld bytes per file (%d variables, %lld cases)\n",
                      static_cast<long long>(kCaseBytes), kVariables,
                      static_cast<long long>(kCases));
-        benchmark::RunSpecifiedBenchmarks();
+        TargetReporter reporter;
+        benchmark::RunSpecifiedBenchmarks(&reporter);
+        reporter.PrintTargets();
     } catch (const std::exception& e) {
         std::fprintf(stderr, "qora_bench: %s\n", e.what());
         result = 1;

@@ -1,12 +1,15 @@
 // Writing ~200 MB of numeric cases through the exported calls, beside the
-// baseline of writing the same bytes with write() in chunks of the library's
-// write buffer to the same directory. Figures are bytes of case data per
+// baseline of writing the same bytes with write() to the same directory, in
+// chunks of the stream's buffer (4 KiB) and of the library's writes of case
+// data (128 KiB). Figures are bytes of case data per
 // second, so each can be given as a ratio to the baseline. Each iteration
 // writes a new file; removing it is left out of the timing.
 #include <benchmark/benchmark.h>
 #include <fcntl.h>
 #include <unistd.h>
 
+#include <algorithm>
+#include <cstring>
 #include <string>
 #include <vector>
 
@@ -16,7 +19,7 @@
 namespace {
 
 constexpr int64_t kPoolCases = 4096;
-constexpr size_t kChunk = 4096;  // QORA_FileStream::kBufferSize
+constexpr size_t kChunk = 128 * 1024;  // WriteBehind::kSize, the writes of case data
 
 // Cases cycled through by every benchmark: mostly whole numbers 1 to 150,
 // which compress to a code byte (the code is the number plus 100 and must
@@ -52,14 +55,44 @@ void RemoveOutput(benchmark::State& state) {
 void WriteBaseline(benchmark::State& state) {
     const char* bytes = reinterpret_cast<const char*>(Pool().data());
     const size_t poolBytes = Pool().size() * sizeof(double);
+    const size_t chunk = size_t(state.range(0));
     for (auto _ : state) {
         const int fd = open(OutputPath().c_str(), O_WRONLY | O_CREAT | O_TRUNC, 0644);
-        for (int64_t done = 0; done < kCaseBytes; done += kChunk) {
-            if (write(fd, bytes + done % poolBytes, kChunk) != ssize_t(kChunk)) {
+        for (int64_t done = 0; done < kCaseBytes; done += chunk) {
+            if (write(fd, bytes + done % poolBytes, chunk) != ssize_t(chunk)) {
                 state.SkipWithError("write failed");
                 break;
             }
         }
+        close(fd);
+        RemoveOutput(state);
+    }
+    state.SetBytesProcessed(state.iterations() * kCaseBytes);
+}
+
+// The floor of a call that takes one case at a time: each case copied into a
+// write buffer of the library's size, written with write() when full.
+void WriteFloor(benchmark::State& state) {
+    constexpr size_t kCaseRecord = kVariables * 8;
+    std::vector<char> buffer(kChunk);
+    for (auto _ : state) {
+        const int fd = open(OutputPath().c_str(), O_WRONLY | O_CREAT | O_TRUNC, 0644);
+        size_t filled = 0;
+        bool failed = false;
+        for (int64_t c = 0; c < kCases && !failed; ++c) {
+            const char* record = reinterpret_cast<const char*>(CaseAt(c));
+            for (size_t done = 0; done < kCaseRecord;) {
+                const size_t n = std::min(kCaseRecord - done, kChunk - filled);
+                std::memcpy(buffer.data() + filled, record + done, n);
+                filled += n;
+                done += n;
+                if (filled < kChunk) continue;
+                failed = write(fd, buffer.data(), kChunk) != ssize_t(kChunk);
+                filled = 0;
+            }
+        }
+        if (failed || write(fd, buffer.data(), filled) != ssize_t(filled))
+            state.SkipWithError("write failed");
         close(fd);
         RemoveOutput(state);
     }
@@ -129,7 +162,13 @@ void WriteSetValueNumeric(benchmark::State& state) {
         double(values), benchmark::Counter::kIsRate | benchmark::Counter::kInvert);
 }
 
-BENCHMARK(WriteBaseline)->Unit(benchmark::kMillisecond)->UseRealTime();
+BENCHMARK(WriteBaseline)
+    ->ArgName("chunk")
+    ->Arg(4096)
+    ->Arg(kChunk)
+    ->Unit(benchmark::kMillisecond)
+    ->UseRealTime();
+BENCHMARK(WriteFloor)->Unit(benchmark::kMillisecond)->UseRealTime();
 BENCHMARK(WriteWholeCaseOut)
     ->ArgName("compressed")
     ->Arg(0)

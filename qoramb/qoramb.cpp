@@ -65,15 +65,41 @@ int Utf8Next(const char* p, size_t n, UChar32* cp) {
     return length;
 }
 
+// Sets the callbacks a codec converts with: stop at anything that cannot be
+// converted, so the caller can keep such bytes as they are.
+ConverterPtr StoppingClone(UConverter* cnv) {
+    ConverterPtr clone = CloneConverter(cnv);
+    if (!clone) return clone;
+    UErrorCode err = U_ZERO_ERROR;
+    ucnv_setToUCallBack(clone.get(), UCNV_TO_U_CALLBACK_STOP, nullptr, nullptr, nullptr, &err);
+    ucnv_setFromUCallBack(clone.get(), UCNV_FROM_U_CALLBACK_STOP, nullptr, nullptr, nullptr, &err);
+    return clone;
+}
+
+// A stopping clone of the current converter, kept per thread and lent to one
+// codec at a time: cloning for every call cost more than upper-casing a name.
+// Made again when the current converter has been replaced.
+struct LentConverter {
+    ConverterPtr cnv;
+    unsigned changes = 0;
+    bool lent = false;
+};
+thread_local LentConverter tLent;
+
 // Reads and writes single characters of one encoding: UTF-8 directly, a code
-// page through a private converter clone that stops at anything it cannot
-// convert (so the caller can keep such bytes as they are).
+// page through a private converter that stops at anything it cannot convert
+// (so the caller can keep such bytes as they are).
 class CharCodec {
   public:
     // The interface encoding (the current converter in code-page mode).
     CharCodec() : CharCodec(mbIsUtf8Mode(), nullptr) {}
     // The code page of cnv.
     explicit CharCodec(UConverter* cnv) : CharCodec(false, cnv) {}
+    CharCodec(const CharCodec&) = delete;
+    CharCodec& operator=(const CharCodec&) = delete;
+    ~CharCodec() {
+        if (fBorrowed) tLent.lent = false;
+    }
 
     // The contract of Utf8Next, in this codec's encoding.
     int Next(const char* p, size_t n, UChar32* cp) {
@@ -84,9 +110,9 @@ class CharCodec {
         }
         const char* end = p;
         UErrorCode err = U_ZERO_ERROR;
-        UChar32 c = ucnv_getNextUChar(fCnv.get(), &end, p + n, &err);
+        UChar32 c = ucnv_getNextUChar(fCnv, &end, p + n, &err);
         int length = static_cast<int>(end - p);
-        if (U_FAILURE(err)) ucnv_resetToUnicode(fCnv.get());
+        if (U_FAILURE(err)) ucnv_resetToUnicode(fCnv);
         if (err == U_TRUNCATED_CHAR_FOUND) return 0;
         *cp = U_SUCCESS(err) ? c : -1;
         return std::max(length, 1);
@@ -105,24 +131,32 @@ class CharCodec {
         int32_t count = 0;
         U16_APPEND_UNSAFE(units, count, cp);
         UErrorCode err = U_ZERO_ERROR;
-        int32_t length = ucnv_fromUChars(fCnv.get(), out, 16, units, count, &err);
+        int32_t length = ucnv_fromUChars(fCnv, out, 16, units, count, &err);
         return U_SUCCESS(err) && length > 0 ? length : -1;
     }
 
   private:
     CharCodec(bool utf8, UConverter* cnv) : fUtf8(utf8) {
         if (fUtf8) return;
-        fCnv = CloneConverter(cnv);
-        if (!fCnv) return;
-        UErrorCode err = U_ZERO_ERROR;
-        ucnv_setToUCallBack(fCnv.get(), UCNV_TO_U_CALLBACK_STOP, nullptr, nullptr, nullptr, &err);
-        ucnv_setFromUCallBack(fCnv.get(), UCNV_FROM_U_CALLBACK_STOP, nullptr, nullptr, nullptr,
-                              &err);
-        ucnv_resetToUnicode(fCnv.get());
+        if (cnv == nullptr && !tLent.lent) {
+            UConverter* current = CurrentConverter();
+            if (current != nullptr && (!tLent.cnv || tLent.changes != CodePageConverterChanges())) {
+                tLent.cnv = StoppingClone(current);
+                tLent.changes = CodePageConverterChanges();
+            }
+            fCnv = tLent.cnv.get();
+            fBorrowed = tLent.lent = fCnv != nullptr;
+        } else {
+            fOwn = StoppingClone(cnv);
+            fCnv = fOwn.get();
+        }
+        if (fCnv) ucnv_reset(fCnv);
     }
 
     bool fUtf8;
-    ConverterPtr fCnv;
+    bool fBorrowed = false;
+    ConverterPtr fOwn;
+    UConverter* fCnv = nullptr;
 };
 
 // The runtime library's view of the character at p: its byte length, 1 for a

@@ -28,6 +28,18 @@ struct CodeTable {
 };
 const CodeTable kCodes;
 
+// Eight control bytes read as one word, so that a block is judged at once.
+constexpr uint64_t kEachByte = 0x0101010101010101ull;
+constexpr uint64_t kLow7 = 0x7F7F7F7F7F7F7F7Full;
+
+// 0x80 in each byte of codes that equals code, 0 in every other byte.
+uint64_t BytesEqual(uint64_t codes, unsigned char code) {
+    const uint64_t x = codes ^ (kEachByte * code);
+    return ~(((x & kLow7) + kLow7) | x) & ~kLow7;
+}
+
+uint32_t CountBytes(uint64_t marks) { return uint32_t(((marks >> 7) * kEachByte) >> 56); }
+
 [[noreturn]] void TooShort(const char* condition, int line) {
     throw SystemFileException(kErrTooShort, condition, __FILE__, line);
 }
@@ -41,7 +53,8 @@ CompressedSystemFile::CompressedSystemFile(uint32_t unitsPerCase, SparseFileInde
       fStream(stream),
       fFile(dynamic_cast<QORA_FileStream*>(stream)),
       fUnits(unitsPerCase),
-      fAhead(new unsigned char[kReadAhead]) {
+      fAhead(new unsigned char[kReadAhead]),
+      fPending(*stream) {
     QORA_ASSERT(index != nullptr);
     QORA_ASSERT(stream != nullptr);
     fStream->Seek(fDataStart, 0);
@@ -106,10 +119,18 @@ bool CompressedSystemFile::LoadBlock() {
         return false;
     }
     const unsigned char* control = fAhead.get() + fAheadBegin;
-    uint32_t raws = 0;
-    for (uint32_t i = 0; i < kKeySize && control[i] != kEndOfBlock; ++i) {
-        raws += control[i] == kRaw;
+    uint64_t codes;
+    std::memcpy(&codes, control, kKeySize);
+    const bool ends = BytesEqual(codes, kEndOfBlock) != 0;
+    uint32_t raws = CountBytes(BytesEqual(codes, kRaw));
+    if (ends) {
+        raws = 0;
+        for (uint32_t i = 0; i < kKeySize && control[i] != kEndOfBlock; ++i) {
+            raws += control[i] == kRaw;
+        }
     }
+    // Every code fills a cell: the block can be decoded without a branch per code.
+    fFullBlock = !ends && BytesEqual(codes, kSkip) == 0;
     const uint32_t length = kKeySize + kUnitSize * raws;
     if (!Fill(length)) TooShort("nRead == nu*sizeof(OBS)", __LINE__);
     fControl = fAhead.get() + fAheadBegin;
@@ -122,6 +143,16 @@ bool CompressedSystemFile::LoadBlock() {
     return true;
 }
 
+void CompressedSystemFile::DecodeFullBlock(unsigned char* out) const {
+    const unsigned char* raw = fControl + kKeySize;
+    for (uint32_t i = 0; i < kKeySize; ++i, out += kUnitSize) {
+        const unsigned char code = fControl[i];
+        const bool isRaw = code == kRaw;
+        std::memcpy(out, isRaw ? raw : kCodes.unit[code], kUnitSize);
+        raw += isRaw ? size_t{kUnitSize} : 0;
+    }
+}
+
 template <bool kStore>
 uint32_t CompressedSystemFile::Decode(unsigned char* out, const unsigned char* swapMask) {
     const uint32_t n = fUnits;
@@ -131,6 +162,14 @@ uint32_t CompressedSystemFile::Decode(unsigned char* out, const unsigned char* s
         if (fPos >= kKeySize && !LoadBlock()) {
             if (cell == 0) return 0;
             TooShort("iCell == 0", __LINE__);
+        }
+        if (fFullBlock && fPos == 0 && n - cell >= kKeySize && !(kStore && swapMask)) {
+            if (kStore) DecodeFullBlock(out + kUnitSize * cell);
+            fRawNext = fControl + (fNextBlock - fBlockStart);
+            fPos = kKeySize;
+            cell += kKeySize;
+            if (cell == n) return n;
+            continue;
         }
         const unsigned char* control = fControl;
         const unsigned char* raw = fRawNext;
@@ -230,29 +269,38 @@ uint32_t CompressedSystemFile::ReadCase(void* units, const unsigned char* swapMa
 
 void CompressedSystemFile::WriteBlock() {
     const uint32_t length = kKeySize + kUnitSize * fRawCount;
-    if (fStream->Seek(fDataStart + fBlockStart, 0) != 0 ||
-        fStream->Write(fBlock, length) != length) {
+    if (!fPending.Put(fDataStart + fBlockStart, fBlock, length))
         RaiseError(kErrStreamWrite, "compressed case data");
-    }
     fNextBlock = fBlockStart + length;
     fAheadStart = fNextBlock;
     fAheadBegin = fAheadEnd = 0;
 }
 
+// Every unit is copied to the next raw slot, which only a raw code keeps:
+// the slot is free again for the next unit otherwise. The block's counters
+// stay in locals between the blocks written.
 void CompressedSystemFile::WriteCase(const void* units) {
     fIndex->Offer(fCurrent, Tell());
     const unsigned char* unit = static_cast<const unsigned char*>(units);
-    for (uint32_t u = 0; u < fUnits; ++u, unit += kUnitSize) {
-        if (fPos >= kKeySize) {
+    const unsigned char* const end = unit + size_t{kUnitSize} * fUnits;
+    uint32_t pos = fPos, raws = fRawCount;
+    for (; unit != end; unit += kUnitSize) {
+        if (pos >= kKeySize) {
             fBlockStart = fNextBlock;
-            fPos = 0;
-            fRawCount = 0;
+            pos = raws = 0;
         }
         const unsigned char code = Encode(unit);
-        fBlock[fPos++] = code;
-        if (code == kRaw) std::memcpy(fBlock + kKeySize + kUnitSize * fRawCount++, unit, kUnitSize);
-        if (fPos == kKeySize) WriteBlock();
+        fBlock[pos++] = code;
+        std::memcpy(fBlock + kKeySize + kUnitSize * raws, unit, kUnitSize);
+        raws += code == kRaw;
+        if (pos == kKeySize) {
+            fPos = pos;
+            fRawCount = raws;
+            WriteBlock();
+        }
     }
+    fPos = pos;
+    fRawCount = raws;
     ++fCurrent;
     fWritten = true;
 }
@@ -263,6 +311,7 @@ void CompressedSystemFile::Finish() {
         std::memset(fBlock + fPos, kSkip, kKeySize - fPos);
         WriteBlock();
     }
+    if (!fPending.Flush()) RaiseError(kErrStreamWrite, "compressed case data");
     if (fFile) fFile->Flush();
     fWritten = false;
 }

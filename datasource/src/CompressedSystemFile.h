@@ -2,11 +2,14 @@
 //
 // Cells are coded in blocks of 8 control bytes, each followed by the raw
 // values its code 253 cells need. Reading decodes whole blocks from a
-// read-ahead buffer; writing collects one block and writes it when full.
+// read-ahead buffer; writing collects blocks and hands them to the stream
+// in large writes.
 #pragma once
 
 #include <cstdint>
 #include <memory>
+
+#include "writebehind.h"
 
 class QORA_StrBaseIO;
 class QORA_FileStream;
@@ -64,6 +67,8 @@ class CompressedSystemFile {
     template <bool kStore>
     uint32_t Decode(unsigned char* out, const unsigned char* swapMask);
     bool LoadBlock();
+    // The loaded block, all of whose codes fill cells, into 8 units.
+    void DecodeFullBlock(unsigned char* out) const;
     bool Fill(uint32_t need);
     void DropReadAhead(int64_t position);
     void WriteBlock();
@@ -93,8 +98,12 @@ class CompressedSystemFile {
     uint32_t fAheadEnd = 0;
     const unsigned char* fControl = nullptr;
     const unsigned char* fRawNext = nullptr;
+    bool fFullBlock = false;  // no code 0 or 252 in the loaded block
 
     // Writing: control bytes, then room for one raw value per control byte.
     unsigned char fBlock[kBlockSize] = {};
     uint32_t fRawCount = 0;
+    // Written blocks not yet handed to the stream; a block written again
+    // (the last one, continued after a finish) starts a new collection.
+    WriteBehind fPending;
 };

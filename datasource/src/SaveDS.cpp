@@ -81,7 +81,7 @@ size_t WholeCharacters(const char* text, size_t length, size_t limit) {
 
 SystemFileDataSource::SaveDS::SaveDS(SystemFileDataSource& parent, QORA_FileStream& stream,
                                      HeaderSettings& settings)
-    : QORA_DataSource(&parent), fSettings(settings), fStream(stream) {
+    : QORA_DataSource(&parent), fSettings(settings), fStream(stream), fPending(stream) {
     SetFileName(nullptr);
 }
 
@@ -330,7 +330,7 @@ void SystemFileDataSource::SaveDS::WriteCase(const void* units) {
             fpCompressor->WriteCase(data);
         } else {
             const uint32_t toWrite = uint32_t(kUnit) * uint32_t(fSettings.fCaseSize);
-            QORA_FILE_CHECK_TEXT(kErrCaseWrite, fStream.Write(data, toWrite) == toWrite, "toWrite");
+            QORA_FILE_CHECK_TEXT(kErrCaseWrite, fPending.Append(data, toWrite), "toWrite");
         }
     } catch (...) {
         fFailed = true;
@@ -344,6 +344,7 @@ void SystemFileDataSource::SaveDS::WriteCase(const void* units) {
 void SystemFileDataSource::SaveDS::Finish() noexcept {
     try {
         if (fpCompressor) fpCompressor->Finish();
+        if (!fPending.Flush()) fFailed = true;
         fStream.Flush();
     } catch (...) {
         fFailed = true;

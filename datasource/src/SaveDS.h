@@ -11,6 +11,7 @@
 
 #include "SystemFileDataSource.h"
 #include "SystemFileExtensionRecord.h"
+#include "writebehind.h"
 
 class SystemFileDataSource::SaveDS : public QORA_DataSource {
   public:
@@ -63,6 +64,7 @@ class SystemFileDataSource::SaveDS : public QORA_DataSource {
     std::vector<std::unique_ptr<Mover>> fMovers;
     std::unique_ptr<unsigned char[]> fpOutput;  // the file's case, when movers exist
     std::unique_ptr<CompressedSystemFile> fpCompressor;
+    WriteBehind fPending;  // raw cases on their way to the stream
     bool fCasesMayFollow = false;
     // A write failed: what reached the file is no longer known case by case.
     bool fFailed = false;

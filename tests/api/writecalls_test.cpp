@@ -198,7 +198,7 @@ TEST(WriteFailures, FailedWritesReportTheirStatus) {
     ASSERT_EQ(qoraSetVarName(full.get(), "x", 0), QORA_STATUS_OK);
     ASSERT_EQ(qoraCommitHeader(full.get()), QORA_STATUS_OK);
     int status = QORA_STATUS_OK;
-    for (int i = 0; i < 1000 && status == QORA_STATUS_OK; ++i)
+    for (int i = 0; i < 100000 && status == QORA_STATUS_OK; ++i)
         status = qoraCommitCaseRecord(full.get());
     EXPECT_EQ(status, QORA_STATUS_WRITE_FAILED);
     EXPECT_EQ(qoraCommitCaseRecord(full.get()), QORA_STATUS_WRITE_FAILED);

@@ -84,8 +84,9 @@ TEST(CompressedCodes, EncoderTable) {
     for (const auto& [unit, code] : rows)
         EXPECT_EQ(code, CompressedSystemFile::Encode(unit.data()));
     for (double raw :
-         {0.5, -0.0, -100.0, 152.0, 255.0, 1.0000001, -1.5, 1e300,
-          std::numeric_limits<double>::infinity(), std::numeric_limits<double>::quiet_NaN()}) {
+         {0.5, -0.0, -100.0, 152.0, 255.0, 1.0000001, -1.5, 1e300, -1e300, -99.5, -100.5, 151.5,
+          std::numeric_limits<double>::infinity(), -std::numeric_limits<double>::infinity(),
+          std::numeric_limits<double>::quiet_NaN()}) {
         EXPECT_EQ(253, CompressedSystemFile::Encode(Num(raw).data())) << raw;
     }
 }
@@ -106,8 +107,9 @@ TEST(CompressedRoundTrip, MixedCasesDecodeToTheSameBytes) {
     std::mt19937 rng(7);
     const Unit pool[] = {Num(0),    Num(-99), Num(151),        Num(0.5),        Num(-0.0),
                          Num(1e10), Sysmis(), Str("        "), Str("abcdefgh"), Num(42)};
-    for (uint32_t units : {1u, 3u, 8u, 13u}) {
-        std::vector<std::vector<Unit>> cases(50, std::vector<Unit>(units));
+    // The last form spans many writes of collected blocks.
+    for (auto [units, count] : {std::pair{1u, 50}, {3u, 50}, {8u, 50}, {13u, 50}, {13u, 5000}}) {
+        std::vector<std::vector<Unit>> cases(count, std::vector<Unit>(units));
         for (auto& one : cases) {
             for (auto& u : one) u = pool[rng() % 10];
         }
