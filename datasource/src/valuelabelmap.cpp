@@ -51,12 +51,12 @@ int CompareUnits(double a, double b) {
     return bitsA < bitsB ? -1 : bitsA > bitsB ? 1 : 0;
 }
 
-// The key as held: without trailing blank units beyond the first.
+// The key as held: without trailing blank units beyond the first, in a
+// string of its own size.
 std::string Trimmed(std::string key) {
     size_t size = key.size();
     while (size > 8 && key.compare(size - 8, 8, kBlankUnit) == 0) size -= 8;
-    key.resize(size);
-    return key;
+    return size == key.size() ? key : key.substr(0, size);
 }
 
 }  // namespace

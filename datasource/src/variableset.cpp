@@ -2,8 +2,7 @@
 
 #include <algorithm>
 #include <climits>
-#include <map>
-#include <set>
+#include <unordered_map>
 #include <unordered_set>
 
 #include "datasrc.h"
@@ -101,15 +100,17 @@ bool SameName(std::string_view a, std::string_view b) {
                          nullptr) == 1;
 }
 
-// The order of names with case ignored: names equal under it are SameName.
-struct NoCaseLess {
-    bool operator()(const std::string& a, const std::string& b) const {
-        return mbCompareNoCase(a.c_str(), b.c_str()) < 0;
-    }
-};
+// A name in upper case, whole: names with equal keys differ at most in case.
+// Worked out once per name, so that a long list is matched in linear time.
+std::string NameKey(std::string_view name) {
+    std::string key(name.size(), '\0');
+    const int n = mbToUpper(name.data(), int(name.size()), key.data(), int(key.size()), nullptr);
+    key.resize(size_t(std::max(n, 0)));
+    return key;
+}
 
-// Where each set of a family sits in the list, by name.
-using SetIndex = std::map<std::string, size_t, NoCaseLess>;
+// Where each set of a family sits in the list, by name key.
+using SetIndex = std::unordered_map<std::string, size_t>;
 
 std::string MemberKey(const std::string& name) {
     std::string cut = name.substr(0, kMemberKeyBytes);
@@ -119,7 +120,7 @@ std::string MemberKey(const std::string& name) {
 
 // A later line naming an earlier set takes that set's place.
 void Merge(QORA_VariableSetList& sets, SetIndex& index, QORA_VariableSet set) {
-    const auto found = index.emplace(set.GetName(), sets.size());
+    const auto found = index.emplace(NameKey(set.GetName()), sets.size());
     if (found.second) {
         sets.push_back(std::move(set));
     } else {
@@ -163,12 +164,13 @@ std::optional<QORA_VariableSet> QORA_VariableSet::Parse(std::string_view line) {
     QORA_VariableSet set;
     set.fName = std::string(*name);
     if (!name->empty() && (*name)[0] == '$' && !ParseMultResp(in, set)) return std::nullopt;
-    std::set<std::string, NoCaseLess> members;
+    std::unordered_set<std::string> members;
     std::string_view rest = in.Rest();
     while (!rest.empty()) {
         const size_t blank = std::min(rest.find(' '), rest.size());
-        std::string member(rest.substr(0, blank));
-        if (blank > 0 && members.insert(member).second) set.fVariables.push_back(std::move(member));
+        const std::string_view member = rest.substr(0, blank);
+        if (blank > 0 && members.insert(NameKey(member)).second)
+            set.fVariables.emplace_back(member);
         rest.remove_prefix(std::min(blank + 1, rest.size()));
     }
     return set;
