@@ -20,5 +20,5 @@ int HandleTable::Close(int handle) {
     // Out of the table before the teardown, so that a failure while the file
     // is finished cannot leave the slot pointing at a half-destroyed entry.
     const std::unique_ptr<FileEntry> closing = std::move(fSlots[handle]);
-    return QORA_STATUS_OK;
+    return closing->Finish();
 }

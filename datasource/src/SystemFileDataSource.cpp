@@ -107,8 +107,10 @@ void SystemFileDataSource::StartAppending() {
 void SystemFileDataSource::FinishWriting() {
     if (fState != kWriting) return;
     fState = kReading;
+    const bool whole = fpWriter->Finish();
     fpWriter.reset();
     fStream.Commit();
+    if (!whole) RaiseError(kErrStreamWrite, GetFileName());
 }
 
 std::unique_ptr<QORA_DataSource> OpenForReading(const char* fileName, WarningSink*) {
