@@ -33,17 +33,19 @@ test: build build-asan locales
 	cd build && ctest --output-on-failure -j $(JOBS)
 	cd build-asan && ASAN_OPTIONS=detect_leaks=1 ctest --output-on-failure -j $(JOBS)
 
-# Seeds from the fixture builder, then a bounded run of the fuzzer; new
-# inputs collect in build-fuzz/corpus, crashes in build-fuzz/artifacts.
+# Seeds from the fixture builder, then a bounded run of each fuzzer: the
+# reader on file bytes, and the calls on sequences a caller could make. New
+# inputs collect in build-fuzz/corpus*, crashes in build-fuzz/artifacts.
 FUZZ_TIME ?= 60
+FUZZ_FLAGS = -max_total_time=$(FUZZ_TIME) -timeout=10 -rss_limit_mb=4096 -print_final_stats=1 \
+  -artifact_prefix=build-fuzz/artifacts/
 fuzz: deps
 	CC=clang CXX=clang++ cmake -S . -B build-fuzz -DCMAKE_BUILD_TYPE=RelWithDebInfo -DQORA_FUZZ=ON >/dev/null
-	cmake --build build-fuzz -j $(JOBS) --target open_read_fuzz fuzz_seeds
-	mkdir -p build-fuzz/seeds build-fuzz/corpus build-fuzz/artifacts
+	cmake --build build-fuzz -j $(JOBS) --target open_read_fuzz call_sequence_fuzz fuzz_seeds
+	mkdir -p build-fuzz/seeds build-fuzz/corpus build-fuzz/corpus-calls build-fuzz/artifacts
 	./build-fuzz/tests/fuzz/fuzz_seeds build-fuzz/seeds
-	./build-fuzz/tests/fuzz/open_read_fuzz -max_total_time=$(FUZZ_TIME) -max_len=65536 \
-	  -timeout=10 -rss_limit_mb=4096 -print_final_stats=1 \
-	  -artifact_prefix=build-fuzz/artifacts/ build-fuzz/corpus build-fuzz/seeds
+	./build-fuzz/tests/fuzz/open_read_fuzz $(FUZZ_FLAGS) -max_len=65536 build-fuzz/corpus build-fuzz/seeds
+	./build-fuzz/tests/fuzz/call_sequence_fuzz $(FUZZ_FLAGS) -max_len=4096 build-fuzz/corpus-calls
 
 bench: deps
 	cmake -S . -B build-bench -DCMAKE_BUILD_TYPE=Release -DQORA_BENCH=ON -DQORA_TESTS=OFF >/dev/null
