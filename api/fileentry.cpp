@@ -18,13 +18,17 @@ FileEntry::FileEntry(std::unique_ptr<QORA_DataSource> dataSource, OpenMode mode)
 }
 
 // A file being written is completed on disk before anything else goes.
-FileEntry::~FileEntry() {
-    if (fpSystemFile == nullptr || fMode == ReadMode) return;
+FileEntry::~FileEntry() { Finish(); }
+
+int FileEntry::Finish() {
+    if (fpSystemFile == nullptr || fMode == ReadMode) return QORA_STATUS_OK;
     try {
         fpSystemFile->FinishWriting();
     } catch (...) {
         // The writer has done what it could; the slot is freed regardless.
+        return QORA_STATUS_WRITE_FAILED;
     }
+    return QORA_STATUS_OK;
 }
 
 SystemFileDataSource* FileEntry::SystemFileOrParent() const {

@@ -36,6 +36,10 @@ struct FileEntry {
     FileEntry(std::unique_ptr<QORA_DataSource> dataSource, OpenMode mode);
     ~FileEntry();
 
+    // Completes a file being written: 0, or QORA_STATUS_WRITE_FAILED when
+    // the file could not be completed, so that its close reports that.
+    int Finish();
+
     // 0 when the entry meets the requirement, else the status code.
     int Check(Access access) const;
     bool HasSystemFile() const { return fpSystemFile != nullptr; }

@@ -3,6 +3,7 @@
 #include "qoraio32.h"
 
 int HandleTable::Insert(std::unique_ptr<FileEntry> entry, int* handle) {
+    const std::lock_guard<std::mutex> guard(fSlotsLock);
     for (int slot = 0; slot < kSlots; ++slot) {
         if (!fSlots[slot]) {
             fSlots[slot] = std::move(entry);
@@ -20,11 +21,16 @@ bool HandleTable::AnyOpen() const {
 }
 
 int HandleTable::Close(int handle) {
-    FileEntry* entry;
-    const int status = Lookup(handle, AccessAny, &entry);
-    if (status != QORA_STATUS_OK) return status;
-    // Out of the table before the teardown, so that a failure while the file
-    // is finished cannot leave the slot pointing at a half-destroyed entry.
-    const std::unique_ptr<FileEntry> closing = std::move(fSlots[handle]);
-    return QORA_STATUS_OK;
+    std::unique_ptr<FileEntry> closing;
+    {
+        const std::lock_guard<std::mutex> guard(fSlotsLock);
+        FileEntry* entry;
+        const int status = Lookup(handle, AccessAny, &entry);
+        if (status != QORA_STATUS_OK) return status;
+        // Out of the table before the teardown, so that a failure while the
+        // file is finished cannot leave the slot pointing at a half-destroyed
+        // entry; the teardown runs unlocked.
+        closing = std::move(fSlots[handle]);
+    }
+    return closing->Finish();
 }

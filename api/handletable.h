@@ -3,6 +3,7 @@
 
 #include <array>
 #include <memory>
+#include <mutex>
 
 #include "fileentry.h"
 
@@ -24,6 +25,9 @@ class HandleTable {
 
   private:
     std::array<std::unique_ptr<FileEntry>, kSlots> fSlots;
+    // Threads that open and close files of their own at once must not take
+    // one slot twice; a lookup reads only its own slot and goes unlocked.
+    std::mutex fSlotsLock;
 };
 
 // The one table of the process, created when the library is loaded (in the

@@ -8,6 +8,7 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
+#include <atomic>
 #include <cerrno>
 
 static_assert(sizeof(off_t) == 8, "file offsets must be 64-bit");
@@ -15,6 +16,18 @@ static_assert(sizeof(off_t) == 8, "file offsets must be 64-bit");
 namespace qora {
 
 namespace {
+
+std::atomic<bool> gFaultArmed{false};
+FileFault gFault;
+std::atomic<int64_t> gFaultCount{0};
+
+// Whether this call is the one to fail; errno is set when it is.
+bool Faulted(FileCall call) {
+    if (!gFaultArmed.load(std::memory_order_relaxed) || (gFault.calls & call) == 0) return false;
+    if (gFaultCount.fetch_add(1) + 1 != gFault.failAt) return false;
+    errno = gFault.error;
+    return true;
+}
 
 int OpenFlags(const FileAccess& access) {
     int flags = O_CLOEXEC;
@@ -33,7 +46,17 @@ int OpenFlags(const FileAccess& access) {
 
 }  // namespace
 
+void InjectFileFault(const FileFault& fault) {
+    gFaultArmed = false;
+    gFault = fault;
+    gFaultCount = 0;
+    gFaultArmed = fault.failAt > 0;
+}
+
+int64_t CountedFileCalls() { return gFaultCount; }
+
 int FileOpen(const char* utf8Name, const FileAccess& access) {
+    if (Faulted(kFileOpen)) return -1;
     int fd;
     // Read and write for everyone the umask allows, as any new file gets here.
     do {
@@ -47,6 +70,7 @@ int FileOpen(const char* utf8Name, const FileAccess& access) {
 }
 
 int64_t FileRead(int fd, void* buffer, uint32_t count) {
+    if (Faulted(kFileRead)) return -1;
     char* out = static_cast<char*>(buffer);
     int64_t done = 0;
     while (done < count) {
@@ -62,6 +86,7 @@ int64_t FileRead(int fd, void* buffer, uint32_t count) {
 }
 
 int64_t FileWrite(int fd, const void* buffer, uint32_t count) {
+    if (Faulted(kFileWrite)) return gFault.shortWrite ? FileWrite(fd, buffer, count / 2) : -1;
     const char* in = static_cast<const char*>(buffer);
     int64_t done = 0;
     while (done < count) {
@@ -77,6 +102,7 @@ int64_t FileWrite(int fd, const void* buffer, uint32_t count) {
 }
 
 int64_t FileSeek(int fd, int64_t offset, int origin) {
+    if (Faulted(kFileSeek)) return -1;
     int whence = origin == 0 ? SEEK_SET : origin == 1 ? SEEK_CUR : SEEK_END;
     return ::lseek(fd, static_cast<off_t>(offset), whence);
 }

@@ -34,4 +34,20 @@ int64_t FileSeek(int fd, int64_t offset, int origin);
 int FileClose(int fd);
 int FileRemove(const char* utf8Name);
 
+// Fault injection, for tests of what the library does when the device fails:
+// the chosen call of the counted kinds fails as the device would. Nothing in
+// the library arms it; unarmed, each call pays one relaxed atomic load.
+enum FileCall : unsigned { kFileOpen = 1, kFileRead = 2, kFileWrite = 4, kFileSeek = 8 };
+struct FileFault {
+    unsigned calls = 0;       // FileCall bits: the kinds of call counted
+    int64_t failAt = 0;       // the failAt-th counted call (from 1) fails; 0: none
+    int error = 0;            // the errno it fails with
+    bool shortWrite = false;  // a failing write puts half its bytes and reports them
+};
+// Arms the fault (or disarms it, with failAt 0) and restarts the count.
+// Not to be called while another thread is in these calls.
+void InjectFileFault(const FileFault& fault);
+// The calls counted since the fault was armed.
+int64_t CountedFileCalls();
+
 }  // namespace qora

@@ -31,17 +31,25 @@ const CodePageName kCodePages[] = {
 };
 
 // Process-wide state: replaced only while no file is open and no call
-// overlaps, so it needs no lock. A replaced converter or collator stays open
-// until unload: a caller may still hold the pointer it was given.
-UConverter* gConverter = nullptr;
+// overlaps. A replaced converter or collator stays open until unload: a
+// caller may still hold the pointer it was given. Each is made on first use,
+// which files opened by several threads at once may reach together: hence
+// the atomics, and the lock below around the making.
+std::atomic<UConverter*> gConverter{nullptr};
 std::atomic<unsigned> gConverterChanges{0};
-UCollator* gCollator = nullptr;
+std::atomic<UCollator*> gCollator{nullptr};
+
+// The one process-wide lock: the locale lookup works on the shared texts
+// below, and the converter and collator are made and retained under it.
+CriticalSection gLocaleLock;
+std::string gLocaleLanguage;
+std::string gLocaleCountry;
 
 struct CollatorCloser {
     void operator()(UCollator* coll) const { ucol_close(coll); }
 };
 
-// Takes ownership until unload and returns the converter.
+// Takes ownership until unload and returns the converter. Under gLocaleLock.
 UConverter* Retain(UConverter* cnv) {
     static std::vector<ConverterPtr> retained;
     retained.emplace_back(cnv);
@@ -53,11 +61,6 @@ UCollator* Retain(UCollator* coll) {
     retained.emplace_back(coll);
     return coll;
 }
-
-// The one process-wide lock; the locale lookup works on the shared texts below.
-CriticalSection gLocaleLock;
-std::string gLocaleLanguage;
-std::string gLocaleCountry;
 
 const char* TableName(long codePage) {
     for (const CodePageName& entry : kCodePages)
@@ -245,6 +248,8 @@ UConverter* OpenConverter(const char* name) {
 }
 
 UConverter* CurrentConverter() {
+    if (UConverter* cnv = gConverter) return cnv;
+    CriticalSection::Lock lock(gLocaleLock);
     if (!gConverter) {
         if (UConverter* cnv = OpenConverter(nullptr)) {
             gConverter = Retain(cnv);
@@ -263,7 +268,7 @@ ConverterPtr CloneConverter(UConverter* cnv) {
 
 UConverter* ExchangeCurrentConverter(UConverter* cnv) {
     ++gConverterChanges;
-    return std::exchange(gConverter, cnv);
+    return gConverter.exchange(cnv);
 }
 
 unsigned CodePageConverterChanges() { return gConverterChanges; }
@@ -280,6 +285,7 @@ std::string EncodingDisplayName(UConverter* cnv) {
 bool SetCodePageConverter(const char* name) {
     UConverter* cnv = OpenConverter(name);
     if (!cnv) return false;
+    CriticalSection::Lock lock(gLocaleLock);
     if (!gConverter || strcmp(ConverterName(cnv), ConverterName(gConverter)) != 0) {
         gConverter = Retain(cnv);
         ++gConverterChanges;
@@ -290,6 +296,8 @@ bool SetCodePageConverter(const char* name) {
 }
 
 UCollator* CurrentCollator() {
+    if (UCollator* coll = gCollator) return coll;
+    CriticalSection::Lock lock(gLocaleLock);
     if (!gCollator) {
         UErrorCode err = U_ZERO_ERROR;
         UCollator* coll = ucol_open(uloc_getDefault(), &err);
@@ -302,6 +310,7 @@ bool SetCollatorLocale(const char* locale) {
     UErrorCode err = U_ZERO_ERROR;
     UCollator* coll = ucol_open(locale, &err);
     if (U_FAILURE(err)) return false;
+    CriticalSection::Lock lock(gLocaleLock);
     UCollator* current = CurrentCollator();
     if (current && ValidLocale(coll) == ValidLocale(current)) {
         ucol_close(coll);

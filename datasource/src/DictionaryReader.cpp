@@ -65,6 +65,8 @@ class DictionaryReader {
     void CloseVariables();
     void ReadVariable();
     void ReadValueLabels();
+    QORA_VLMap LabelMap(const std::vector<std::pair<std::string, std::string>>& pairs,
+                        int type) const;
     void AttachValueLabels(const std::vector<std::pair<std::string, std::string>>& pairs,
                            const std::vector<int>& indexes);
     void ReadDocuments();
@@ -233,33 +235,47 @@ void DictionaryReader::ReadValueLabels() {
 // The first variable listed decides whether the values are numbers or
 // strings; a map goes only to variables of that kind, so that every value
 // handed out is as wide as its variable and is found again by its own
-// value. A string value is cut to its variable's width and blank-padded;
-// variables of one width share one map.
+// value. A string value is cut to its variable's width and blank-padded.
+// Variables of one width share one map; the maps of widths that cut the
+// values alike share their pairs, so that a record listing variables of
+// many widths costs its labels once.
 void DictionaryReader::AttachValueLabels(
     const std::vector<std::pair<std::string, std::string>>& pairs,
     const std::vector<int>& indexes) {
     const bool numeric = fSource.GetVariable(indexes[0]).GetType() == 0;
-    std::map<int, QORA_VLMap> byType;
+    std::map<int, QORA_VLMap> byType, byCut;
     for (int index : indexes) {
         QORA_Variable& var = fSource.GetVariable(index);
         const int type = var.GetType();
         if ((type == 0) != numeric) continue;
         auto found = byType.find(type);
         if (found == byType.end()) {
-            QORA_VLMap map(type);
-            for (std::pair<std::string, std::string> pair : pairs) {
-                if (numeric) {
-                    if (fSettings.fSwapped) SwapBytes(&pair.first[0], kStringValueSize);
-                    map.Insert(pair.first.data(), pair.second);
-                } else {
-                    map.Insert(pair.first.data(), std::min<int>(type, kStringValueSize),
-                               pair.second);
-                }
-            }
+            const int cut = std::min<int>(type, kStringValueSize);
+            auto model = byCut.find(cut);
+            if (model == byCut.end()) model = byCut.emplace(cut, LabelMap(pairs, type)).first;
+            QORA_VLMap map = model->second;
+            map.SetKeyType(type);
             found = byType.emplace(type, map).first;
         }
         var.SetValueLabels(found->second);
     }
+}
+
+QORA_VLMap DictionaryReader::LabelMap(const std::vector<std::pair<std::string, std::string>>& pairs,
+                                      int type) const {
+    QORA_VLMap map(type);
+    std::vector<QORA_VLMapImpl::Pair> keyed;
+    keyed.reserve(pairs.size());
+    for (std::pair<std::string, std::string> pair : pairs) {
+        if (type == 0) {
+            if (fSettings.fSwapped) SwapBytes(&pair.first[0], kStringValueSize);
+        } else {
+            pair.first = map.KeyFromText(pair.first.data(), std::min<int>(type, kStringValueSize));
+        }
+        keyed.push_back({std::move(pair.first), std::move(pair.second)});
+    }
+    map.InsertAll(std::move(keyed));
+    return map;
 }
 
 void DictionaryReader::ReadDocuments() {

@@ -47,18 +47,16 @@ const QORA_SetFamily kSetFamilies[] = {QORA_SetFamily::kVariableSets,
 
 // Sets may name variables the file does not have: those names go, and the
 // records of a family that lost any are written again from what is left.
-void PruneStoredSets(QORA_DataSource& source) {
+// When the names will change their case, the sets are written again anyway;
+// the variables' names do not show in them, so that is done here, from the
+// one parse of each family.
+void PruneStoredSets(QORA_DataSource& source, bool rewrite) {
     for (QORA_SetFamily family : kSetFamilies) {
         QORA_VariableSetList sets = LoadVariableSets(source, family);
-        if (PruneVariableSets(sets, source)) ReplaceVariableSets(source, family, sets);
-    }
-}
-
-// After the names changed their case, the sets are written again.
-void RestoreSets(QORA_DataSource& source) {
-    for (QORA_SetFamily family : kSetFamilies) {
-        const QORA_VariableSetList sets = LoadVariableSets(source, family);
-        if (!sets.empty()) StoreVariableSets(source, sets);
+        if (PruneVariableSets(sets, source))
+            ReplaceVariableSets(source, family, sets);
+        else if (rewrite && !sets.empty())
+            StoreVariableSets(source, sets);
     }
 }
 
@@ -86,10 +84,7 @@ void RepairNames(QORA_DataSource& source) {
 }
 
 void RepairAfterReading(QORA_DataSource& source, bool longNamesSeen) {
-    PruneStoredSets(source);
+    PruneStoredSets(source, !longNamesSeen);
     RepairNames(source);
-    if (!longNamesSeen) {
-        LowerCaseNames(source);
-        RestoreSets(source);
-    }
+    if (!longNamesSeen) LowerCaseNames(source);
 }

@@ -76,6 +76,7 @@ void ImportEntry(QORA_DataSource& source, EntryReader& in) {
     const bool matched = index >= 0 && source.GetVariable(index).IsString() &&
                          source.GetVariable(index).GetType() == varType;
     QORA_VLMap map = matched ? QORA_VLMap(varType) : QORA_VLMap();
+    std::vector<QORA_VLMapImpl::Pair> pairs;
     for (int32_t k = 0; k < nLabels; ++k) {
         const int32_t valLen = in.CheckedInt();
         QORA_FILE_CHECK(kErrBadFormat, valLen >= 0);
@@ -85,10 +86,12 @@ void ImportEntry(QORA_DataSource& source, EntryReader& in) {
         const int32_t labelLen = in.CheckedInt();
         QORA_FILE_CHECK(kErrBadFormat, labelLen >= 0);
         QORA_FILE_CHECK_TEXT(kErrBadFormat, labelLen <= in.Left(), "r + labelLen <= endr");
-        const std::string label = in.Bytes(labelLen);
-        if (matched) map.Insert(value.data(), valLen, label);
+        std::string label = in.Bytes(labelLen);
+        if (matched) pairs.push_back({map.KeyFromText(value.data(), valLen), std::move(label)});
     }
-    if (matched) source.GetVariable(index).SetValueLabels(map);
+    if (!matched) return;
+    map.InsertAll(std::move(pairs));
+    source.GetVariable(index).SetValueLabels(map);
 }
 
 class SFExtensionVLExtStrings : public SystemFileExtensionHandler {

@@ -85,9 +85,7 @@ SystemFileDataSource::SaveDS::SaveDS(SystemFileDataSource& parent, QORA_FileStre
     SetFileName(nullptr);
 }
 
-SystemFileDataSource::SaveDS::~SaveDS() {
-    if (fCasesMayFollow) Finish();
-}
+SystemFileDataSource::SaveDS::~SaveDS() { Finish(); }
 
 void SystemFileDataSource::SaveDS::PrepareDictionary() {
     std::set<std::string> keys;
@@ -310,7 +308,9 @@ void SystemFileDataSource::SaveDS::AppendRaw(int64_t dataStart) {
     fStream.Commit();
     const char* name = fStream.Name();
     if (name == nullptr || !fStream.Open(name, "r+b")) RaiseError(kErrCannotOpen, GetFileName());
-    fStream.Seek(0, SEEK_END);
+    // Without the end of the file the cases already there are unknown, and
+    // new ones would be written over them.
+    if (fStream.Seek(0, SEEK_END) != 0) RaiseError(kErrStreamRead, GetFileName());
     const int64_t dataBytes = std::max<int64_t>(0, fStream.Tell() - dataStart);
     fCasesBefore = caseBytes > 0 ? dataBytes / caseBytes : 0;
     fStream.Seek(dataStart + fCasesBefore * caseBytes, SEEK_SET);
@@ -341,7 +341,9 @@ void SystemFileDataSource::SaveDS::WriteCase(const void* units) {
 
 // After a failed write the file holds an unknown number of whole cases: the
 // counts then say "unknown", so that no count claims a case that is not there.
-void SystemFileDataSource::SaveDS::Finish() noexcept {
+bool SystemFileDataSource::SaveDS::Finish() noexcept {
+    if (!fCasesMayFollow) return true;
+    fCasesMayFollow = false;
     try {
         if (fpCompressor) fpCompressor->Finish();
         if (!fPending.Flush()) fFailed = true;
@@ -351,20 +353,22 @@ void SystemFileDataSource::SaveDS::Finish() noexcept {
     }
     fpCompressor.reset();
     const int64_t total = fFailed || fCasesBefore < 0 ? -1 : fCasesBefore + fCasesWritten;
-    if (total == fSettings.fCaseCount && 0 <= total && total <= INT32_MAX) return;
+    if (total == fSettings.fCaseCount && 0 <= total && total <= INT32_MAX) return !fFailed;
     try {
-        PatchCounts(total);
+        return PatchCounts(total) && !fFailed;
     } catch (...) {
         // The counts stay as they were: -1 for a new file, the earlier count
         // of an appended one.
+        return false;
     }
 }
 
-void SystemFileDataSource::SaveDS::PatchCounts(int64_t total) {
+// False when the file could not be reopened to take the counts.
+bool SystemFileDataSource::SaveDS::PatchCounts(int64_t total) {
     const char* name = fStream.Name();
-    if (name == nullptr) return;
+    if (name == nullptr) return false;
     fStream.Flush();
-    if (!fStream.Open(name, "rb+")) return;
+    if (!fStream.Open(name, "rb+")) return false;
     const int32_t headerCount = 0 <= total && total <= INT32_MAX ? int32_t(total) : -1;
     fStream.Seek(SystemFileHeader::kCaseCountOffset, SEEK_SET);
     fStream.Write(&headerCount, sizeof headerCount);
@@ -375,6 +379,7 @@ void SystemFileDataSource::SaveDS::PatchCounts(int64_t total) {
         fStream.Flush();
     }
     fSettings.fCaseCount = total;
+    return true;
 }
 
 const unsigned char* SystemFileDataSource::SaveDS::OrdinaryMover::Move(

@@ -44,6 +44,11 @@ class SystemFileDataSource::SaveDS : public QORA_DataSource {
 
     // One case in the caller's layout (the parent's dictionary).
     void WriteCase(const void* units);
+    // Completes the file once cases could follow: flushes the cases and
+    // patches the counts. False when the file is not whole: a write failed,
+    // or the counts could not be patched. Never raises; runs once (the
+    // destructor runs it when nobody did).
+    bool Finish() noexcept;
 
   private:
     void PrepareExtensions();
@@ -51,8 +56,7 @@ class SystemFileDataSource::SaveDS : public QORA_DataSource {
     void OpenCompressor(SparseFileIndex& index, int64_t dataStart);
     int64_t CompressedCases(SparseFileIndex& index, int64_t dataStart);
     void AppendRaw(int64_t dataStart);
-    void Finish() noexcept;
-    void PatchCounts(int64_t total);
+    bool PatchCounts(int64_t total);
 
     HeaderSettings& fSettings;
     QORA_FileStream& fStream;

@@ -120,8 +120,10 @@ void SystemFileDataSource::StartAppending() {
 void SystemFileDataSource::FinishWriting() {
     if (fState != kWriting) return;
     fState = kReading;
+    const bool whole = fpWriter->Finish();
     fpWriter.reset();
     fStream.Commit();
+    if (!whole) RaiseError(kErrStreamWrite, GetFileName());
 }
 
 namespace {

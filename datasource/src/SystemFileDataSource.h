@@ -22,6 +22,8 @@ class IndependentDataStore : public QORA_DataSource {
     // One case in the dictionary's layout (ValueCount() units).
     virtual void WriteCase(const void* units) = 0;
     // Completes the file on disk; nothing when no cases are being written.
+    // Raises internal error 1002 when the file could not be completed (a
+    // write failed, or its counts could not be patched).
     virtual void FinishWriting() = 0;
     // Takes effect when the dictionary is written.
     virtual void SetCompression(bool on) = 0;

@@ -12,7 +12,9 @@ namespace {
 // The local time in seconds since 14 October 1582 (proleptic Gregorian).
 double LocalTimeStamp() {
     const std::time_t now = std::time(nullptr);
-    const std::tm* t = now == std::time_t(-1) ? nullptr : std::localtime(&now);
+    // The reentrant form: files are opened by several threads at once.
+    std::tm local;
+    const std::tm* t = now == std::time_t(-1) ? nullptr : localtime_r(&now, &local);
     if (!t) return 12379867200.0;
     const int64_t days = GregorianDays(t->tm_year + 1900, t->tm_mon + 1, t->tm_mday);
     const int64_t seconds = t->tm_hour * 3600 + t->tm_min * 60 + t->tm_sec;

@@ -8,10 +8,14 @@
 
 namespace {
 
-// One 8-byte unit as stored: a little-endian double, whatever the host.
+const char kBlankUnit[] = "        ";
+
+// One 8-byte unit as stored: a little-endian double, whatever the host; a
+// unit past the end of the key is blank.
 double UnitValue(const std::string& key, size_t unit) {
+    const char* bytes = 8 * unit < key.size() ? &key[8 * unit] : kBlankUnit;
     uint64_t bits = 0;
-    for (int i = 7; i >= 0; --i) bits = (bits << 8) | static_cast<unsigned char>(key[8 * unit + i]);
+    for (int i = 7; i >= 0; --i) bits = (bits << 8) | static_cast<unsigned char>(bytes[i]);
     double value;
     std::memcpy(&value, &bits, sizeof value);
     return value;
@@ -47,21 +51,30 @@ int CompareUnits(double a, double b) {
     return bitsA < bitsB ? -1 : bitsA > bitsB ? 1 : 0;
 }
 
+// The key as held: without trailing blank units beyond the first, in a
+// string of its own size.
+std::string Trimmed(std::string key) {
+    size_t size = key.size();
+    while (size > 8 && key.compare(size - 8, 8, kBlankUnit) == 0) size -= 8;
+    return size == key.size() ? key : key.substr(0, size);
+}
+
 }  // namespace
 
-QORA_VLMapImpl::QORA_VLMapImpl(int32_t keyType) : fKeyType(keyType) {
+QORA_VLMapImpl::QORA_VLMapImpl(int32_t keyType)
+    : fKeyType(keyType), fPairs(std::make_shared<std::vector<Pair>>()) {
     QORA_ASSERT(IsValidKeyType(keyType));
 }
 
-// Keys of different lengths (after a change of key type) are compared over
-// their common units, the shorter first when those agree.
+// Keys of different lengths (a held key, or one stored before a change of
+// key type) are compared as if padded with blank units.
 int QORA_VLMapImpl::CompareKeys(const std::string& a, const std::string& b) {
-    size_t units = std::min(a.size(), b.size()) / 8;
+    const size_t units = (std::max(a.size(), b.size()) + 7) / 8;
     for (size_t u = 0; u < units; ++u) {
         int c = CompareUnits(UnitValue(a, u), UnitValue(b, u));
         if (c != 0) return c;
     }
-    return a.size() < b.size() ? -1 : a.size() > b.size() ? 1 : 0;
+    return 0;
 }
 
 void QORA_VLMapImpl::SetKeyType(int32_t keyType) {
@@ -71,24 +84,52 @@ void QORA_VLMapImpl::SetKeyType(int32_t keyType) {
 
 std::vector<QORA_VLMapImpl::Pair>::const_iterator QORA_VLMapImpl::LowerBound(
     const std::string& key) const {
-    return std::lower_bound(fPairs.begin(), fPairs.end(), key,
+    return std::lower_bound(fPairs->begin(), fPairs->end(), key,
                             [](const Pair& pair, const std::string& probe) {
                                 return CompareKeys(pair.key, probe) < 0;
                             });
 }
 
+std::vector<QORA_VLMapImpl::Pair>& QORA_VLMapImpl::EditPairs() {
+    if (fPairs.use_count() > 1) fPairs = std::make_shared<std::vector<Pair>>(*fPairs);
+    return *fPairs;
+}
+
 void QORA_VLMapImpl::Insert(std::string key, std::string label) {
-    auto it = LowerBound(key);
-    if (it != fPairs.end() && it->key == key) {
-        fPairs[it - fPairs.begin()].label = std::move(label);
+    key = Trimmed(std::move(key));
+    const size_t at = LowerBound(key) - fPairs->begin();
+    std::vector<Pair>& pairs = EditPairs();
+    if (at < pairs.size() && pairs[at].key == key) {
+        pairs[at].label = std::move(label);
     } else {
-        fPairs.insert(it, Pair{std::move(key), std::move(label)});
+        pairs.insert(pairs.begin() + at, Pair{std::move(key), std::move(label)});
     }
 }
 
+// A stable sort keeps equal keys in their order of arrival; the last of them
+// wins, as it would by replacing the label of the ones before.
+void QORA_VLMapImpl::InsertAll(std::vector<Pair> pairs) {
+    pairs.insert(pairs.begin(), fPairs->begin(), fPairs->end());
+    for (Pair& pair : pairs) pair.key = Trimmed(std::move(pair.key));
+    const auto less = [](const Pair& a, const Pair& b) { return CompareKeys(a.key, b.key) < 0; };
+    std::stable_sort(pairs.begin(), pairs.end(), less);
+    std::vector<Pair> merged;
+    merged.reserve(pairs.size());
+    for (Pair& pair : pairs) {
+        if (!merged.empty() && merged.back().key == pair.key) {
+            merged.back().label = std::move(pair.label);
+        } else {
+            merged.push_back(std::move(pair));
+        }
+    }
+    merged.shrink_to_fit();
+    fPairs = std::make_shared<std::vector<Pair>>(std::move(merged));
+}
+
 const std::string* QORA_VLMapImpl::Lookup(const std::string& key) const {
-    auto it = LowerBound(key);
-    return it != fPairs.end() && it->key == key ? &it->label : nullptr;
+    const std::string held = Trimmed(key);
+    auto it = LowerBound(held);
+    return it != fPairs->end() && it->key == held ? &it->label : nullptr;
 }
 
 QORA_VLMap::QORA_VLMap(int32_t keyType) : fpImpl(new QORA_VLMapImpl(keyType)) {}
@@ -137,12 +178,21 @@ const std::string* QORA_VLMap::Lookup(const char* text, int length) const {
     return IsValid() ? fpImpl->Lookup(KeyFromText(text, length)) : nullptr;
 }
 
+void QORA_VLMap::InsertAll(std::vector<QORA_VLMapImpl::Pair> pairs) {
+    QORA_ASSERT(IsValid());
+    for (const auto& pair : pairs) {
+        QORA_ASSERT(!pair.key.empty() && pair.key.size() % 8 == 0);
+        QORA_ASSERT(pair.key.size() <= size_t(fpImpl->KeyBytes()));
+    }
+    fpImpl.Mutable()->InsertAll(std::move(pairs));
+}
+
 std::string QORA_VLMap::KeyFromText(const char* text, int length) const {
     std::string key(fpImpl->KeyBytes(), ' ');
-    if (text == nullptr) return key;
+    if (text == nullptr) return Trimmed(std::move(key));
     if (length < 0) length = static_cast<int>(std::strlen(text));
     mbCopyPadded(key.data(), key.size(), text, length);
-    return key;
+    return Trimmed(std::move(key));
 }
 
 void QORA_VLMap::Reset() { fIter = 0; }
@@ -163,6 +213,7 @@ int QORA_VLMap::Next(std::string& units, std::string& label) {
     const QORA_VLMapImpl::Pair* pair = Step();
     if (!pair) return 0;
     units = pair->key;
+    if (units.size() < size_t(fpImpl->KeyBytes())) units.resize(fpImpl->KeyBytes(), ' ');
     label = pair->label;
     return 1;
 }

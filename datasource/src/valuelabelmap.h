@@ -4,6 +4,7 @@
 #pragma once
 
 #include <cstdint>
+#include <memory>
 #include <optional>
 #include <string>
 #include <vector>
@@ -14,7 +15,9 @@ class QORA_VLMapImpl : public QORA_RefCntObject {
   public:
     enum { eMaxKeyType = 32767 };
     // A key: units(key type) 8-byte value units; a numeric key is one double,
-    // a string key the blank-padded bytes of the value.
+    // a string key the blank-padded bytes of the value. A key is held without
+    // its trailing all-blank units beyond the first, so that short values of
+    // a wide string cost what they hold.
     struct Pair {
         std::string key;
         std::string label;
@@ -28,24 +31,30 @@ class QORA_VLMapImpl : public QORA_RefCntObject {
     // Value units of a key of the given type: 1 up to 8 bytes, else (w + 7) / 8.
     static int UnitsFor(int32_t keyType) { return keyType <= 8 ? 1 : (keyType + 7) / 8; }
     // The ordering of keys: unit by unit, each unit as a little-endian double.
-    // Returns <0, 0 or >0; 0 only for keys equal bit for bit.
+    // Returns <0, 0 or >0; 0 only for keys equal bit for bit once padded
+    // with blank units to the same length.
     static int CompareKeys(const std::string& a, const std::string& b);
 
     int32_t KeyType() const { return fKeyType; }
     void SetKeyType(int32_t keyType);
     int KeyBytes() const { return 8 * UnitsFor(fKeyType); }
-    const std::vector<Pair>& Pairs() const { return fPairs; }
+    const std::vector<Pair>& Pairs() const { return *fPairs; }
 
     // Adds the pair, or replaces the label of an equal key.
     void Insert(std::string key, std::string label);
+    // Adds every pair, as Insert would one after the other, in O(n log n).
+    void InsertAll(std::vector<Pair> pairs);
     // The label of a key bit-for-bit equal to key, or null.
     const std::string* Lookup(const std::string& key) const;
 
   private:
     std::vector<Pair>::const_iterator LowerBound(const std::string& key) const;
+    std::vector<Pair>& EditPairs();
 
     int32_t fKeyType;
-    std::vector<Pair> fPairs;  // sorted by CompareKeys, no two keys equal
+    // Sorted by CompareKeys, no two keys equal. Clones made to change only
+    // the key type share the pairs until one of them changes a pair.
+    std::shared_ptr<std::vector<Pair>> fPairs;
 };
 
 // The handle to a value label map (null for no labels), with an optional
@@ -72,6 +81,11 @@ class QORA_VLMap {
     // text of length bytes (-1: up to its terminator), padded with blanks to
     // the key's units; a longer text is cut at a whole character.
     void Insert(const char* text, int length, const std::string& label);
+    // Each pair's key is whole units, at most KeyBytes(), padded with blank
+    // units as needed; the same as Insert one by one.
+    void InsertAll(std::vector<QORA_VLMapImpl::Pair> pairs);
+    // The key of a text as Insert(text, length, label) makes it, as held.
+    std::string KeyFromText(const char* text, int length) const;
 
     // The label of the key, or null when absent or the handle is null.
     const std::string* Lookup(const void* units) const;
@@ -94,7 +108,6 @@ class QORA_VLMap {
     bool operator!=(const QORA_VLMap& other) const { return !(*this == other); }
 
   private:
-    std::string KeyFromText(const char* text, int length) const;
     const QORA_VLMapImpl::Pair* Step();
 
     QORA_CowRef<QORA_VLMapImpl> fpImpl;

@@ -2,6 +2,7 @@
 
 #include <algorithm>
 #include <climits>
+#include <unordered_map>
 #include <unordered_set>
 
 #include "datasrc.h"
@@ -99,6 +100,18 @@ bool SameName(std::string_view a, std::string_view b) {
                          nullptr) == 1;
 }
 
+// A name in upper case, whole: names with equal keys differ at most in case.
+// Worked out once per name, so that a long list is matched in linear time.
+std::string NameKey(std::string_view name) {
+    std::string key(name.size(), '\0');
+    const int n = mbToUpper(name.data(), int(name.size()), key.data(), int(key.size()), nullptr);
+    key.resize(size_t(std::max(n, 0)));
+    return key;
+}
+
+// Where each set of a family sits in the list, by name key.
+using SetIndex = std::unordered_map<std::string, size_t>;
+
 std::string MemberKey(const std::string& name) {
     std::string cut = name.substr(0, kMemberKeyBytes);
     mbTruncate(cut.data(), static_cast<int>(kMemberKeyBytes));
@@ -106,18 +119,17 @@ std::string MemberKey(const std::string& name) {
 }
 
 // A later line naming an earlier set takes that set's place.
-void Merge(QORA_VariableSetList& sets, QORA_VariableSet set) {
-    for (QORA_VariableSet& earlier : sets) {
-        if (SameName(earlier.GetName(), set.GetName())) {
-            earlier = std::move(set);
-            return;
-        }
+void Merge(QORA_VariableSetList& sets, SetIndex& index, QORA_VariableSet set) {
+    const auto found = index.emplace(NameKey(set.GetName()), sets.size());
+    if (found.second) {
+        sets.push_back(std::move(set));
+    } else {
+        sets[found.first->second] = std::move(set);
     }
-    sets.push_back(std::move(set));
 }
 
 void LoadRecord(const QORA_DataSource& source, int32_t type, bool multResp,
-                QORA_VariableSetList& sets) {
+                QORA_VariableSetList& sets, SetIndex& index) {
     if (!source.HasExtension(type)) return;
     const QORA_Extension record = source.GetExtension(type);
     const std::string_view content = record.Impl()->Content();
@@ -132,7 +144,7 @@ void LoadRecord(const QORA_DataSource& source, int32_t type, bool multResp,
         std::optional<QORA_VariableSet> set = multResp && line[0] != '$'
                                                   ? QORA_VariableSet::Parse("$" + std::string(line))
                                                   : QORA_VariableSet::Parse(line);
-        if (set) Merge(sets, std::move(*set));
+        if (set) Merge(sets, index, std::move(*set));
     }
 }
 
@@ -152,10 +164,13 @@ std::optional<QORA_VariableSet> QORA_VariableSet::Parse(std::string_view line) {
     QORA_VariableSet set;
     set.fName = std::string(*name);
     if (!name->empty() && (*name)[0] == '$' && !ParseMultResp(in, set)) return std::nullopt;
+    std::unordered_set<std::string> members;
     std::string_view rest = in.Rest();
     while (!rest.empty()) {
         const size_t blank = std::min(rest.find(' '), rest.size());
-        if (blank > 0) set.AddVariable(rest.substr(0, blank));
+        const std::string_view member = rest.substr(0, blank);
+        if (blank > 0 && members.insert(NameKey(member)).second)
+            set.fVariables.emplace_back(member);
         rest.remove_prefix(std::min(blank + 1, rest.size()));
     }
     return set;
@@ -215,13 +230,21 @@ void QORA_VariableSet::RemoveVariable(size_t k) {
     fVariables.erase(fVariables.begin() + static_cast<std::ptrdiff_t>(k));
 }
 
+bool QORA_VariableSet::RemoveVariablesIf(const std::function<bool(const std::string&)>& unwanted) {
+    const auto kept = std::remove_if(fVariables.begin(), fVariables.end(), unwanted);
+    const bool removed = kept != fVariables.end();
+    fVariables.erase(kept, fVariables.end());
+    return removed;
+}
+
 QORA_VariableSetList LoadVariableSets(const QORA_DataSource& source, QORA_SetFamily family) {
     QORA_VariableSetList sets;
+    SetIndex index;
     if (family == QORA_SetFamily::kMultipleResponse) {
-        LoadRecord(source, kMultRespExtension, true, sets);
-        LoadRecord(source, kExtendedMultRespExtension, true, sets);
+        LoadRecord(source, kMultRespExtension, true, sets, index);
+        LoadRecord(source, kExtendedMultRespExtension, true, sets, index);
     } else {
-        LoadRecord(source, kVariableSetExtension, false, sets);
+        LoadRecord(source, kVariableSetExtension, false, sets, index);
     }
     return sets;
 }
@@ -257,21 +280,14 @@ bool PruneVariableSets(QORA_VariableSetList& sets, const QORA_DataSource& source
     std::unordered_set<std::string> keys;
     for (int i = 0; i < source.ColumnCount(); ++i) keys.insert(source.GetVariable(i).GetKey());
     bool removed = false;
-    for (auto set = sets.begin(); set != sets.end();) {
-        for (size_t k = 0; k < set->GetVariables().size();) {
-            if (keys.count(MemberKey(set->GetVariables()[k])) == 0) {
-                set->RemoveVariable(k);
-                removed = true;
-            } else {
-                ++k;
-            }
-        }
-        if (set->GetVariables().empty()) {
-            set = sets.erase(set);
-            removed = true;
-        } else {
-            ++set;
-        }
+    for (QORA_VariableSet& set : sets) {
+        removed |= set.RemoveVariablesIf(
+            [&keys](const std::string& name) { return keys.count(MemberKey(name)) == 0; });
     }
+    const auto kept = std::remove_if(sets.begin(), sets.end(), [](const QORA_VariableSet& set) {
+        return set.GetVariables().empty();
+    });
+    removed |= kept != sets.end();
+    sets.erase(kept, sets.end());
     return removed;
 }

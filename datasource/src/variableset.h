@@ -6,6 +6,7 @@
 
 #include <cstddef>
 #include <cstdint>
+#include <functional>
 #include <optional>
 #include <string>
 #include <string_view>
@@ -69,6 +70,8 @@ class QORA_VariableSet {
     void SetVariable(size_t k, std::string name);
     // Precondition k < count.
     void RemoveVariable(size_t k);
+    // Removes every member the predicate names; returns whether any went.
+    bool RemoveVariablesIf(const std::function<bool(const std::string&)>& unwanted);
 
   private:
     void SetFlag(uint32_t flag, bool on) { fFlags = on ? (fFlags | flag) : (fFlags & ~flag); }

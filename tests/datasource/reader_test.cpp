@@ -160,16 +160,21 @@ TEST_P(Reader, ValueLabelsServeOnlyVariablesOfTheirKindAndWidth) {
     const int n = b.Numeric("N").Slot();
     const int s3 = b.String("S3", 3).Slot();
     const int t20 = b.String("T20", 20).Slot();
-    b.ValueLabels({{"ABCDEFGH", "long"}, {"AB", "short"}}, {s20, n, s3, t20});
+    const int s255 = b.String("S255", 255).Slot();
+    b.ValueLabels({{"ABCDEFGH", "long"}, {"AB", "short"}}, {s20, n, s3, t20, s255});
     auto source = OpenFixture(b.WriteTemp());
 
     EXPECT_FALSE(source->GetVariable(1).GetValueLabels().IsValid());
     const QORA_VLMap wide = source->GetVariable(0).GetValueLabels();
     EXPECT_TRUE(wide.SameObject(source->GetVariable(3).GetValueLabels()));
     const QORA_VLMap narrow = source->GetVariable(2).GetValueLabels();
+    const QORA_VLMap widest = source->GetVariable(4).GetValueLabels();
     ASSERT_EQ(wide.KeyType(), 20);
     ASSERT_EQ(narrow.KeyType(), 3);
-    for (QORA_VLMap map : {wide, narrow}) {
+    ASSERT_EQ(widest.KeyType(), 255);
+    // Widths that cut the values alike hold one copy of the labels.
+    EXPECT_EQ(&wide.Impl()->Pairs(), &widest.Impl()->Pairs());
+    for (QORA_VLMap map : {wide, narrow, widest}) {
         std::string text, label;
         int count = 0;
         for (map.Reset(); map.NextText(text, label); ++count) {

@@ -64,11 +64,13 @@ TEST(VLMapTest, KeysThatReadAsNaNStayFindable) {
 TEST(VLMapTest, StringKeysArePaddedToWholeUnitsAndOrderedByChunk) {
     QORA_VLMap map(10);
     map.Insert("AB", 2, "label");
-    EXPECT_EQ(map.Impl()->Pairs()[0].key, "AB" + std::string(14, ' '));
     EXPECT_EQ(*map.Lookup("AB        ", 10), "label");
     EXPECT_EQ(*map.Lookup("AB", -1), "label");
     map.Reset();
-    std::string text, label;
+    std::string units, text, label;
+    ASSERT_EQ(map.Next(units, label), 1);
+    EXPECT_EQ(units, "AB" + std::string(14, ' '));
+    map.Reset();
     ASSERT_EQ(map.NextText(text, label), 1);
     EXPECT_EQ(text, "AB        ");
     map.Insert(std::string(40, 'x').c_str(), 40, "long");  // cut to the units
@@ -171,3 +173,40 @@ TEST(VLMapTest, EqualityComparesPairsNotKeyType) {
 }
 
 }  // namespace
+
+TEST(VLMapTest, InsertAllEqualsInsertingOneByOne) {
+    // Repeats, both zeros and keys that read as NaN, in an order of their own.
+    std::vector<double> values;
+    for (int i = 0; i < 200; ++i) values.push_back((i * 37 % 101) - 50.0);
+    values.insert(values.end(), {0.0, -0.0, std::nan(""), 0.0, 7.0});
+    QORA_VLMap oneByOne(0), all(0);
+    all.Insert(7.0, "before");
+    oneByOne.Insert(7.0, "before");
+    std::vector<QORA_VLMapImpl::Pair> pairs;
+    for (size_t i = 0; i < values.size(); ++i) {
+        const std::string label = "L" + std::to_string(i);
+        oneByOne.Insert(values[i], label);
+        std::string key(8, '\0');
+        std::memcpy(key.data(), &values[i], 8);  // the test host is little-endian
+        pairs.push_back({key, label});
+    }
+    all.InsertAll(pairs);
+    EXPECT_TRUE(all == oneByOne);
+    EXPECT_EQ(all.Count(), 103);  // -50 to 50, -0 and NaN
+}
+
+TEST(VLMapTest, WideKeysHoldOnlyTheirValueAndMixWithOldWidths) {
+    QORA_VLMap map(255);
+    map.InsertAll({{map.KeyFromText("b", 1), "b"}, {map.KeyFromText("a", 1), "a"}});
+    EXPECT_EQ(map.Impl()->Pairs()[0].key, "a       ");
+    EXPECT_EQ(*map.Lookup((std::string("b") + std::string(254, ' ')).c_str(), 255), "b");
+    std::string units, label;
+    map.Reset();
+    ASSERT_EQ(map.Next(units, label), 1);
+    EXPECT_EQ(units, "a" + std::string(255, ' '));
+    // A key stored at a narrower width is found again at the wider one.
+    QORA_VLMap grown(8);
+    grown.Insert("ab", 2, "ab");
+    grown.SetKeyType(20);
+    EXPECT_EQ(*grown.Lookup("ab", 2), "ab");
+}
