@@ -11,7 +11,7 @@ PYTHON := /usr/bin/python3
 PREFIX ?= /usr/local
 SUDO := $(shell [ "$$(id -u)" = 0 ] || echo sudo)
 
-.PHONY: run test deps build build-asan locales bench fuzz clean install
+.PHONY: run test deps build build-asan locales bench fuzz clean install mutate
 
 deps:
 	@missing=$$(for p in $(PACKAGES); do dpkg -s $$p >/dev/null 2>&1 || echo $$p; done); \
@@ -68,4 +68,9 @@ bench: deps
 	QORAIO_LIBRARY_DIR=build-bench $(PYTHON) bench/python_bench.py
 
 clean:
-	rm -rf build build-asan build-fuzz build-bench
+	rm -rf build build-asan build-fuzz build-bench build-mutate
+
+# How many small faults the tests catch: a fixed sample of mutants of the
+# library, each built in build-mutate and run against the release tests.
+mutate: deps locales
+	$(PYTHON) tools/mutate.py
