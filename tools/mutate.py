@@ -137,6 +137,14 @@ def run(cmd, cwd, timeout):
         return None
 
 
+def first_failure(build):
+    try:
+        with open(os.path.join(build, "Testing", "Temporary", "LastTestsFailed.log")) as f:
+            return f.readline().strip().split(":", 1)[-1]
+    except OSError:
+        return "a timeout"
+
+
 def object_of(build, path):
     rel = os.path.relpath(path, ROOT)
     return os.path.join(build, "CMakeFiles", "qoracore.dir", rel + ".o")
@@ -228,8 +236,8 @@ def main():
                 verdict = "SURVIVED"
             else:
                 killed.append(where)
-                verdict = "killed"
-        print(f"[{i}/{len(sample)}] {verdict:14} {where}", flush=True)
+                verdict = "killed by " + first_failure(build)
+        print(f"[{i}/{len(sample)}] {where}: {verdict}", flush=True)
     run(build_cmd, ROOT, None)
 
     built = len(killed) + len(survived)
