@@ -205,9 +205,15 @@ def main():
     parser.add_argument("--build", default=os.path.join(ROOT, "build-mutate"))
     parser.add_argument("--jobs", default="2")
     parser.add_argument("--list", action="store_true", help="print the sample and stop")
+    parser.add_argument("--only", metavar="LOG",
+                        help="try only the sampled mutants named in LOG (a run's output)")
     args = parser.parse_args()
 
     sample = random.Random(args.seed).sample(all_mutants(), args.count)
+    if args.only:
+        with open(args.only, encoding="utf-8") as f:
+            named = f.read()
+        sample = [m for m in sample if f"{os.path.relpath(m[0], ROOT)}:{m[1]}: {m[2]}" in named]
     if args.list:
         for path, number, desc, _ in sample:
             print(f"{os.path.relpath(path, ROOT)}:{number}: {desc}")
