@@ -93,35 +93,6 @@ TEST_P(SystemFileIteratorTest, FillsTheCallersBuffer) {
     EXPECT_EQ(buffer[3], ExpectedY(0));
 }
 
-// The plan comes from the very long strings record; here it is installed
-// as that record's handler would.
-TEST_P(SystemFileIteratorTest, VeryLongStringsAreJoinedFromTheirSegments) {
-    std::string text;
-    for (int i = 0; i < 300; ++i) text += char('A' + i % 26);
-    b.Numeric("A");
-    b.String("S", 300);
-    b.Numeric("B");
-    b.Case({1.5, text, -2.0});
-    b.Case({2.0, "short", 3.0});
-    source = OpenFixture(b.WriteTemp());
-    ASSERT_EQ(source->ValueCount(), 40);
-    auto plan = std::make_unique<SystemFileDechunker>();
-    plan->Add(SystemFileDechunker::LeadingEntry(1));
-    plan->Add(SystemFileDechunker::StringEntry(1, 300, 1, 1));
-    source->Settings().fpDechunker = std::move(plan);
-    it.reset(source->NewIterator(nullptr));
-    ASSERT_TRUE(it->ReadCase());
-    EXPECT_EQ(Number(*it, 0), 1.5);
-    EXPECT_EQ(std::string(static_cast<const char*>(it->ValuePointer(1)), 304), text + "    ");
-    EXPECT_EQ(
-        *reinterpret_cast<const double*>(static_cast<const char*>(it->Case().Buffer()) + 39 * 8),
-        -2.0);
-    ASSERT_TRUE(it->ReadCase());
-    EXPECT_EQ(std::string(static_cast<const char*>(it->ValuePointer(1)), 304),
-              "short" + std::string(299, ' '));
-    EXPECT_FALSE(it->ReadCase());
-}
-
 TEST_P(SystemFileIteratorTest, APlanThatLeavesTheCaseIsRefusedWhenTheIteratorIsMade) {
     Open(1);
     it.reset();
