@@ -11,7 +11,7 @@ PYTHON := /usr/bin/python3
 PREFIX ?= /usr/local
 SUDO := $(shell [ "$$(id -u)" = 0 ] || echo sudo)
 
-.PHONY: run test deps deps32 build build-asan locales bench fuzz tsan test32 clean install
+.PHONY: run test deps deps32 build build-asan locales bench fuzz tsan test32 clean install mutate
 
 deps:
 	@missing=$$(for p in $(PACKAGES); do dpkg -s $$p >/dev/null 2>&1 || echo $$p; done); \
@@ -97,4 +97,9 @@ bench: deps
 	QORAIO_LIBRARY_DIR=build-bench $(PYTHON) bench/python_bench.py
 
 clean:
-	rm -rf build build-asan build-fuzz build-bench build-tsan build-32
+	rm -rf build build-asan build-fuzz build-bench build-tsan build-32 build-mutate
+
+# How many small faults the tests catch: a fixed sample of mutants of the
+# library, each built in build-mutate and run against the release tests.
+mutate: deps locales
+	$(PYTHON) tools/mutate.py

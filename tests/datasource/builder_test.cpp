@@ -171,32 +171,6 @@ TEST(SysFileBuilder, VeryLongStringSegments) {
     EXPECT_EQ(wide.String("W", 504).Units(), 64);
 }
 
-TEST(SysFileBuilder, CompressedBlocksFollowTheCodeTable) {
-    SysFileBuilder b;
-    for (const char* name : {"A", "B", "C"}) b.Numeric(name);
-    b.String("S", 8);
-    b.Compressed().Case({1.0, 2.0, 3.0, "ABCDEFGH"});
-    const Bytes built = b.Build();
-    EXPECT_EQ(Bytes(built.begin() + b.DataStart(), built.end()),
-              (Bytes{101, 102, 103, 253, 0, 0, 0, 0, 'A', 'B', 'C', 'D', 'E', 'F', 'G', 'H'}));
-
-    SysFileBuilder codes(Endian::Swapped);
-    codes.Numeric("X");
-    codes.String("S", 8);
-    codes.Compressed();
-    codes.Case({0.5, "        "}).Case({100.0, "x"}).Case({kSysmis, 151.0});
-    codes.Case({-99.0, "y"}).Case({-0.0, ""});
-    const Bytes c = codes.Build();
-    const size_t at = codes.DataStart();
-    EXPECT_EQ(Slice(c, at, 8), (Bytes{253, 254, 200, 253, 255, 251, 1, 253}));
-    EXPECT_EQ(Slice(c, at + 8, 8), codes.Double(0.5));  // raw numbers keep the file's order
-    EXPECT_EQ(TextAt(c, at + 16, 8), "x       ");
-    EXPECT_EQ(TextAt(c, at + 24, 8), "y       ");
-    EXPECT_EQ(Slice(c, at + 32, 8), (Bytes{253, 254, 0, 0, 0, 0, 0, 0}));
-    EXPECT_EQ(Slice(c, at + 40, 8), codes.Double(-0.0));
-    EXPECT_EQ(c.size(), at + 48);
-}
-
 TEST(SysFileBuilder, ExtensionRecordsAndTheirTexts) {
     SysFileBuilder b(Endian::Swapped);
     b.Numeric("AGE").LongName("age");

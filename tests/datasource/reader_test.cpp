@@ -298,46 +298,6 @@ TEST_P(Reader, RepeatedAndInvalidNamesAreRenamed) {
     EXPECT_EQ(names, (std::vector<std::string>{"age", "v2", "v1", "v3", "v4", "v5"}));  // V1 taken
 }
 
-// A large dictionary of every kind of variable reads back exactly.
-TEST_P(Reader, ThousandVariablesReadBackExactly) {
-    SysFileBuilder b(GetParam());
-    for (int i = 0; i < 1000; ++i) {
-        const std::string name = "V" + std::to_string(i);
-        const int kind = i % 4;
-        if (kind == 0) {
-            b.Numeric(name).Label("Number " + std::to_string(i)).Missing({double(i)});
-        } else if (kind == 1) {
-            b.String(name, 1 + i % 255).Label(std::string(i % 200, 'x'));
-        } else if (kind == 2) {
-            b.Numeric(name).MissingRange(-double(i), double(i));
-        } else {
-            b.String(name, 8).MissingStrings({"m" + std::to_string(i % 100)});
-        }
-    }
-    // Value label records follow the variable records.
-    for (int i = 0; i < 1000; i += 4)
-        b.ValueLabels({{double(i), "L" + std::to_string(i)}}, {b.Slot("V" + std::to_string(i))});
-    auto source = OpenFixture(b.WriteTemp());
-    ASSERT_EQ(source->ColumnCount(), 1000);
-    EXPECT_EQ(source->ValueCount(), b.CaseUnits());
-    for (int i = 0; i < 1000; ++i) {
-        const std::string n = std::to_string(i);
-        const QORA_Variable& var = source->GetVariable(i);
-        EXPECT_EQ(source->ValueOffset(i) + 1, b.Slot("V" + n));
-        const std::string x = std::string(i % 200, 'x'), width = std::to_string(1 + i % 255);
-        const std::string expected[] = {
-            "v" + n + "|0|Number " + n + "|1|" + n + " |5.8.2|5.8.2",
-            "v" + n + "|" + width + "|" + x + "|0||1." + width + ".0|1." + width + ".0",
-            "v" + n + "|0|(none)|-2|-" + n + " " + n + " |5.8.2|5.8.2",
-            "v" + n + "|8|(none)|1|" + ("m" + std::to_string(i % 100) + "      ").substr(0, 8) +
-                ",|1.8.0|1.8.0"};
-        ASSERT_EQ(Describe(var), expected[i % 4]);
-        if (i % 4 == 0) {
-            EXPECT_EQ(*var.GetValueLabels().Lookup(double(i)), "L" + n);
-        }
-    }
-}
-
 TEST_P(Reader, SetsLoseMembersTheFileDoesNotHave) {
     SysFileBuilder b(GetParam());
     b.Numeric("A");

@@ -1,5 +1,6 @@
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <cstring>
 #include <memory>
 #include <random>
@@ -64,75 +65,6 @@ INSTANTIATE_TEST_SUITE_P(Forms, SystemFileIteratorTest, AllDataForms(), DataForm
 
 }  // namespace
 
-TEST_P(SystemFileIteratorTest, ReadsEveryCaseThenReportsTheEndAgainAndAgain) {
-    Open(7);
-    EXPECT_TRUE(it->CanSeek());
-    for (int i = 0; i < 7; ++i) ExpectCase(i);
-    EXPECT_FALSE(it->ReadCase());
-    EXPECT_FALSE(it->ReadCase());
-    EXPECT_EQ(it->TellCase(), 7);
-    EXPECT_EQ(source->CaseCount(), 7);
-}
-
-TEST_P(SystemFileIteratorTest, AnUnknownCountBecomesKnownAtTheEnd) {
-    Open(7, -1);
-    EXPECT_EQ(source->CaseCount(), -1);
-    for (int i = 0; i < 7; ++i) ExpectCase(i);
-    EXPECT_EQ(source->CaseCount(), -1);
-    EXPECT_FALSE(it->ReadCase());
-    EXPECT_EQ(source->CaseCount(), 7);
-}
-
-TEST_P(SystemFileIteratorTest, AHeaderCountThatLiesIsCorrectedAtTheEnd) {
-    for (int32_t claimed : {10, 3}) {
-        SCOPED_TRACE(claimed);
-        b = SysFileBuilder(std::get<0>(GetParam()));
-        b.Compressed(std::get<1>(GetParam()));
-        Open(7, claimed);
-        EXPECT_EQ(source->CaseCount(), claimed);
-        for (int i = 0; i < 7; ++i) ExpectCase(i);
-        EXPECT_FALSE(it->ReadCase());
-        EXPECT_EQ(source->CaseCount(), 7);
-    }
-}
-
-// The end met after a seek beyond it counts the cases the file holds, not
-// the case asked for.
-TEST_P(SystemFileIteratorTest, ASeekFarBeyondTheEndReadsNothingAndCountsTheCases) {
-    Open(7, -1);
-    ASSERT_TRUE(it->SeekCase(1000));
-    EXPECT_EQ(it->TellCase(), 1000);
-    EXPECT_FALSE(it->ReadCase());
-    EXPECT_EQ(source->CaseCount(), 7);
-    ASSERT_TRUE(it->SeekCase(6));
-    ExpectCase(6);
-    EXPECT_FALSE(it->ReadCase());
-    ASSERT_TRUE(it->SeekCase(int64_t{1} << 40));
-    EXPECT_FALSE(it->ReadCase());
-    EXPECT_EQ(source->CaseCount(), 7);
-}
-
-TEST_P(SystemFileIteratorTest, SeeksForwardBackwardAndToTheCaseJustRead) {
-    Open(7);
-    ASSERT_TRUE(it->SeekCase(5));
-    ExpectCase(5);
-    ASSERT_TRUE(it->SeekCase(2));
-    ExpectCase(2);
-    ExpectCase(3);
-    ASSERT_TRUE(it->SeekCase(3));
-    ExpectCase(3);
-    ASSERT_TRUE(it->SeekCase(0));
-    ExpectCase(0);
-}
-
-TEST_P(SystemFileIteratorTest, PositionsBeforeTheFirstCaseAreRefused) {
-    Open(3);
-    ExpectCase(0);
-    EXPECT_FALSE(it->SeekCase(-1));
-    EXPECT_EQ(it->TellCase(), 1);
-    ExpectCase(1);
-}
-
 TEST_P(SystemFileIteratorTest, IteratorsReadIndependentlyAndAreCounted) {
     Open(4);
     EXPECT_EQ(source->LiveIterators(), 1);
@@ -159,58 +91,6 @@ TEST_P(SystemFileIteratorTest, FillsTheCallersBuffer) {
     EXPECT_EQ(buffer[0], 0.0);
     EXPECT_EQ(std::memcmp(&buffer[1], "case 0          ", 16), 0);
     EXPECT_EQ(buffer[3], ExpectedY(0));
-}
-
-// Enough cases to cross the read-ahead and to fill the sparse index.
-TEST_P(SystemFileIteratorTest, RandomSeeksOverManyCasesFindTheirCases) {
-    const int n = 9000;
-    Open(n);
-    std::mt19937 random(7);
-    for (int round = 0; round < 300; ++round) {
-        const int i = int(random() % (n + 20));
-        ASSERT_TRUE(it->SeekCase(i));
-        if (i >= n) {
-            EXPECT_FALSE(it->ReadCase());
-            continue;
-        }
-        ExpectCase(i);
-        if (i + 1 < n) ExpectCase(i + 1);
-    }
-    ASSERT_TRUE(it->SeekCase(0));
-    for (int i = 0; i < n; ++i) {
-        ASSERT_TRUE(it->ReadCase());
-        ASSERT_EQ(Number(*it, 0), ExpectedX(i));
-    }
-    EXPECT_FALSE(it->ReadCase());
-}
-
-// The plan comes from the very long strings record; here it is installed
-// as that record's handler would.
-TEST_P(SystemFileIteratorTest, VeryLongStringsAreJoinedFromTheirSegments) {
-    std::string text;
-    for (int i = 0; i < 300; ++i) text += char('A' + i % 26);
-    b.Numeric("A");
-    b.String("S", 300);
-    b.Numeric("B");
-    b.Case({1.5, text, -2.0});
-    b.Case({2.0, "short", 3.0});
-    source = OpenFixture(b.WriteTemp());
-    ASSERT_EQ(source->ValueCount(), 40);
-    auto plan = std::make_unique<SystemFileDechunker>();
-    plan->Add(SystemFileDechunker::LeadingEntry(1));
-    plan->Add(SystemFileDechunker::StringEntry(1, 300, 1, 1));
-    source->Settings().fpDechunker = std::move(plan);
-    it.reset(source->NewIterator(nullptr));
-    ASSERT_TRUE(it->ReadCase());
-    EXPECT_EQ(Number(*it, 0), 1.5);
-    EXPECT_EQ(std::string(static_cast<const char*>(it->ValuePointer(1)), 304), text + "    ");
-    EXPECT_EQ(
-        *reinterpret_cast<const double*>(static_cast<const char*>(it->Case().Buffer()) + 39 * 8),
-        -2.0);
-    ASSERT_TRUE(it->ReadCase());
-    EXPECT_EQ(std::string(static_cast<const char*>(it->ValuePointer(1)), 304),
-              "short" + std::string(299, ' '));
-    EXPECT_FALSE(it->ReadCase());
 }
 
 TEST_P(SystemFileIteratorTest, APlanThatLeavesTheCaseIsRefusedWhenTheIteratorIsMade) {
@@ -261,11 +141,6 @@ class CompressedBlocksTest : public ByteOrders {
         source = OpenFixture(b.WriteTemp());
         it.reset(source->NewIterator(nullptr));
     }
-    std::vector<double> ReadAllX() {
-        std::vector<double> values;
-        while (it->ReadCase()) values.push_back(Number(*it, 0));
-        return values;
-    }
     SysFileBuilder b;
     std::unique_ptr<SystemFileDataSource> source;
     IteratorPtr it;
@@ -275,40 +150,6 @@ INSTANTIATE_TEST_SUITE_P(Orders, CompressedBlocksTest,
                          ::testing::Values(Endian::Native, Endian::Swapped), EndianName);
 
 }  // namespace
-
-// A 252 ends the block wherever it stands: the codes after it, raw ones
-// included, count for nothing.
-TEST_P(CompressedBlocksTest, Code252EndsItsBlockAtAnyPosition) {
-    for (int at = 0; at < 8; ++at) {
-        SCOPED_TRACE(at);
-        SetUp();
-        b.Numeric("X");
-        std::array<uint8_t, 8> codes;
-        codes.fill(253);
-        std::vector<double> expected;
-        std::vector<Value> raws;
-        for (int k = 0; k < at; ++k) {
-            codes[k] = k % 2 ? 253 : 101 + k;
-            expected.push_back(k % 2 ? 0.5 + k : 1.0 + k);
-            if (k % 2) raws.push_back(0.5 + k);
-        }
-        codes[at] = 252;
-        b.Data(b.Block(codes, raws));
-        b.Data(b.Block({253, 0, 0, 0, 0, 0, 0, 0}, {Value(-7.5)}));
-        expected.push_back(-7.5);
-        Open();
-        EXPECT_EQ(ReadAllX(), expected);
-        EXPECT_EQ(source->CaseCount(), int64_t(expected.size()));
-    }
-}
-
-TEST_P(CompressedBlocksTest, BlocksWithoutCellsEndCleanly) {
-    b.Numeric("X");
-    for (int k = 0; k < 2000; ++k) b.Data(b.Block({0, 0, 252, 253, 253, 0, 0, 0}, {}));
-    Open();
-    EXPECT_TRUE(ReadAllX().empty());
-    EXPECT_EQ(source->CaseCount(), 0);
-}
 
 TEST_P(CompressedBlocksTest, ControlBytesCutShortAreAnError) {
     b.Numeric("X");
@@ -354,15 +195,6 @@ TEST_P(CompressedBlocksTest, RawCellsFollowTheFileOrderAndStringsNever) {
     EXPECT_FALSE(it->ReadCase());
 }
 
-TEST_P(SystemFileIteratorTest, TheLastCaseCanBeReadAgainAfterTheEnd) {
-    Open(3);
-    for (int i = 0; i < 3; ++i) ExpectCase(i);
-    EXPECT_FALSE(it->ReadCase());
-    ASSERT_TRUE(it->SeekCase(2));
-    ExpectCase(2);
-    EXPECT_FALSE(it->ReadCase());
-}
-
 // 24-byte cases never line up with the read-ahead or the stream's blocks.
 TEST_P(SystemFileIteratorTest, CasesStraddlingTheReadAheadArriveWhole) {
     const int n = 15000;
@@ -381,15 +213,50 @@ TEST_P(SystemFileIteratorTest, CasesStraddlingTheReadAheadArriveWhole) {
     EXPECT_EQ(source->CaseCount(), n);
 }
 
-TEST_P(SystemFileIteratorTest, ReadingIntoOtherMemoryLeavesTheCaseAlone) {
-    Open(2);
-    ExpectCase(0);
-    double record[4];
-    ASSERT_TRUE(it->ReadCaseInto(record));
-    EXPECT_EQ(record[0], ExpectedX(1));
-    EXPECT_EQ(std::string(reinterpret_cast<char*>(&record[1]), 16), ExpectedS(1) + "    ");
-    EXPECT_EQ(Number(*it, 0), ExpectedX(0));
-    EXPECT_FALSE(it->ReadCaseInto(record));
-    ASSERT_TRUE(it->SeekCase(1));
-    ExpectCase(1);
+// A random walk of reads and seeks against a model of where the iterator
+// stands, over every kind of header count: exact, unknown, too high, too low.
+// Enough cases to cross the read-ahead and to fill the sparse index.
+TEST_P(SystemFileIteratorTest, RandomWalkOfReadsAndSeeksFollowsTheModel) {
+    const int n = 9000;
+    std::mt19937 random(7);
+    for (int32_t claimed : {n, -1, n + 3, 3}) {
+        SCOPED_TRACE(claimed);
+        b = SysFileBuilder(std::get<0>(GetParam()));
+        b.Compressed(std::get<1>(GetParam()));
+        Open(n, claimed);
+        EXPECT_TRUE(it->CanSeek());
+        EXPECT_EQ(source->CaseCount(), claimed);
+        for (int i = 0; i < n; ++i) ASSERT_TRUE(it->ReadCase()) << i;
+        EXPECT_EQ(source->CaseCount(), claimed);
+        int64_t at = n, current = n - 1;  // the model: next case, case in the buffer
+        for (int step = 0; step < 400; ++step) {
+            const int op = int(random() % 4);
+            if (op == 0) {
+                // Beyond the end, before the first case, the last case, the case just
+                // read again, or anywhere.
+                const int64_t targets[] = {int64_t{1} << 40, -1, n - 1, current,
+                                           int64_t(random() % (n + 20))};
+                const int64_t to = targets[std::min<uint64_t>(random() % 8, 4)];
+                ASSERT_EQ(it->SeekCase(to), to >= 0);
+                if (to >= 0) at = to;
+                ASSERT_EQ(it->TellCase(), at);
+            } else if (op == 3) {
+                double record[4];
+                ASSERT_EQ(it->ReadCaseInto(record), at < n) << at;
+                if (at >= n) continue;
+                EXPECT_EQ(record[0], ExpectedX(int(at)));
+                EXPECT_EQ(std::string(reinterpret_cast<char*>(&record[1]), 16),
+                          ExpectedS(int(at)) + "    ");
+                ++at;
+                EXPECT_EQ(Number(*it, 0), ExpectedX(int(current)));
+            } else if (at < n) {
+                current = at++;
+                ExpectCase(int(current));
+            } else {
+                ASSERT_FALSE(it->ReadCase()) << at;
+                ASSERT_FALSE(it->ReadCase()) << at;
+                ASSERT_EQ(source->CaseCount(), n);
+            }
+        }
+    }
 }

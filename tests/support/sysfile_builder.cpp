@@ -175,11 +175,6 @@ Var& Var::TypeField(int32_t type) {
     return *this;
 }
 
-Var& Var::HasLabelField(int32_t hasLabel) {
-    fHasLabelField = hasLabel;
-    return *this;
-}
-
 Var& Var::LabelLengthField(int32_t length) {
     fLabelLengthField = length;
     return *this;
@@ -263,7 +258,7 @@ void SysFileBuilder::WriteVar(Out& out, const Var& var) const {
         const bool hasLabel = var.fLabel.has_value();
         out.I32(2);
         out.I32(first && var.fTypeField ? *var.fTypeField : width);
-        out.I32(first && var.fHasLabelField ? *var.fHasLabelField : hasLabel);
+        out.I32(hasLabel);
         out.I32(first ? var.fMissingCode : 0);
         out.I32(first && var.fPrint ? *var.fPrint : format);
         out.I32(first && var.fWrite ? *var.fWrite : format);
@@ -591,8 +586,6 @@ Bytes SysFileBuilder::Int64(int64_t value) const {
     out.I64(value);
     return out.bytes;
 }
-
-Bytes SysFileBuilder::Double(double value) const { return Unit(value); }
 
 Bytes SysFileBuilder::Unit(const Value& value) const {
     Out out(fEndian == Endian::Swapped);

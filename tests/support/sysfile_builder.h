@@ -107,7 +107,6 @@ class Var {
 
     // Overrides for malformed records (first record of the variable).
     Var& TypeField(int32_t type);
-    Var& HasLabelField(int32_t hasLabel);
     Var& LabelLengthField(int32_t length);
     Var& Continuations(int count);  // continuation records after the first record
 
@@ -128,7 +127,7 @@ class Var {
     int32_t fMissingCode = 0;
     std::vector<Value> fMissing;
     std::optional<uint32_t> fPrint, fWrite;
-    std::optional<int32_t> fTypeField, fHasLabelField, fLabelLengthField;
+    std::optional<int32_t> fTypeField, fLabelLengthField;
     std::optional<int> fContinuations;
 };
 
@@ -227,7 +226,6 @@ class SysFileBuilder {
     Bytes Int32(int32_t value) const;
     Bytes Int32s(const std::vector<int32_t>& values) const;
     Bytes Int64(int64_t value) const;
-    Bytes Double(double value) const;
     Bytes Unit(const Value& value) const;  // one 8-byte value unit
     // One compressed block: 8 control bytes and the raw units that follow.
     Bytes Block(std::array<uint8_t, 8> codes, const std::vector<Value>& raws) const;
