@@ -155,7 +155,7 @@ int QORA_API qoraSetVarLabel(int handle, const char* name, const char* label) {
             var.SetLabel(text.c_str(), text.size());
             return QORA_STATUS_OK;
         }
-        text.resize(std::strlen(mbTruncate(text.data(), kMaxLabelBytes)));
+        text = mbPrefix(text, kMaxLabelBytes);
         var.SetLabel(text.c_str(), text.size());
         return QORA_WARN_LABEL_TRUNCATED;
     });

@@ -431,6 +431,11 @@ char* mbTruncate(char* text, int n) {
     return text;
 }
 
+std::string mbPrefix(const std::string& text, size_t maxBytes) {
+    std::string cut = text.substr(0, maxBytes);
+    return std::string(mbTruncate(&cut[0], int(cut.size())));
+}
+
 void mbCopyBounded(char* dst, const char* src, size_t size) {
     if (!dst || size == 0) return;
     size_t n = src ? strnlen(src, size - 1) : 0;

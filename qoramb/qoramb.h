@@ -13,6 +13,7 @@
 #include <unicode/umachine.h>
 
 #include <cstddef>
+#include <string>
 
 #include "codepage.h"
 
@@ -70,6 +71,9 @@ int mbCompareNoCase(const char* a, const char* b);
 
 // Terminates text at the largest whole-character boundary not beyond n bytes.
 char* mbTruncate(char* text, int n);
+// The longest prefix of text, up to its first NUL, of at most maxBytes bytes
+// that ends on a whole character.
+std::string mbPrefix(const std::string& text, size_t maxBytes);
 // Copies the longest run of whole characters that fits in size - 1 bytes and
 // zero-fills the rest of the size bytes.
 void mbCopyBounded(char* dst, const char* src, size_t size);

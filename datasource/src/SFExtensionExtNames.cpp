@@ -39,7 +39,7 @@ std::string BijectiveBase26(unsigned k) {
 
 // The first 8 bytes of the key, without the dots and underscores it ends in.
 std::string CutKey(const std::string& key) {
-    std::string candidate = WholeCharPrefix(key, kShortNameBytes);
+    std::string candidate = mbPrefix(key, kShortNameBytes);
     while (!candidate.empty() && (candidate.back() == '.' || candidate.back() == '_'))
         candidate.pop_back();
     return candidate;
@@ -75,7 +75,7 @@ void RenameSetMembers(QORA_DataSource& source, const Renames& renames, bool expo
                 const auto found = renames.find(name);
                 if (found != renames.end()) name = found->second;
                 if (exporting) {
-                    const std::string cut = WholeCharPrefix(name, kMaxNameBytes);
+                    const std::string cut = mbPrefix(name, kMaxNameBytes);
                     name = MakeLookupKey(cut.data(), cut.size());
                 }
                 set.SetVariable(k, std::move(name));
@@ -112,7 +112,7 @@ void ParseNames(const std::string& text, NameList& list) {
         QORA_FILE_CHECK_TEXT(kErrBadFormat, j == len || text[j] == '\t',
                              "j == len || extString[j] == '\\t'");
         list.emplace_back(text.substr(pos, i - pos),
-                          WholeCharPrefix(text.substr(i + 1, j - i - 1), kMaxNameBytes));
+                          mbPrefix(text.substr(i + 1, j - i - 1), kMaxNameBytes));
         pos = j + 1;
     }
 }
@@ -147,11 +147,6 @@ SFExtensionExtNames gHandler;
 const bool gRegistered = (RegisterExtensionHandler(kLongNamesExtension, gHandler), true);
 
 }  // namespace
-
-std::string WholeCharPrefix(const std::string& text, size_t maxBytes) {
-    std::string cut = text.substr(0, maxBytes);
-    return std::string(mbTruncate(cut.data(), int(cut.size())));
-}
 
 void GenerateShortNames(const QORA_DataSource& source, HeaderSettings& settings) {
     NameList& list = settings.fNameList;

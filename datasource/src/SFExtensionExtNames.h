@@ -10,10 +10,6 @@
 class QORA_DataSource;
 struct HeaderSettings;
 
-// The longest prefix of text of at most maxBytes bytes that ends on a whole
-// character of the interface encoding.
-std::string WholeCharPrefix(const std::string& text, size_t maxBytes);
-
 // Gives every variable of the source a unique short name of at most 8
 // bytes: settings.fNameList becomes one (name, short name) pair per
 // variable, in dictionary order. Raises internal error 1504, naming the

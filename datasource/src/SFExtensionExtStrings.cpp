@@ -19,10 +19,12 @@
 #include "SystemFileExtensionRecord.h"
 #include "datasrc.h"
 #include "dserror.h"
+#include "qoramb.h"
 
 namespace {
 
-enum : int { kMaxShortString = 255, kSegmentChars = 252, kBaseBytes = 5 };
+using Plan = SystemFileDechunker;
+enum : int { kMaxShortString = Plan::kSegmentWidth, kBaseBytes = 5 };
 // Bytes of an entry in which its "=" and the end of its width must appear,
 // the digits a width may have and the NULs and tabs that may end it.
 constexpr ptrdiff_t kNameField = 16, kWidthField = 10, kMaxDigits = 5, kMaxSeparators = 2;
@@ -30,16 +32,8 @@ constexpr ptrdiff_t kNameField = 16, kWidthField = 10, kMaxDigits = 5, kMaxSepar
 // Very long strings by dictionary index: their widths.
 using StringWidths = std::map<int, int>;
 
-int SegmentCount(int width) { return (width + kSegmentChars - 1) / kSegmentChars; }
-
-int SegmentWidth(int width, int j) {
-    return j < width / kSegmentChars ? kMaxShortString : width % kSegmentChars;
-}
-
 // Segments after the first are named from the first bytes of its key.
-std::string SegmentBase(const QORA_Variable& first) {
-    return WholeCharPrefix(first.GetKey(), kBaseBytes);
-}
+std::string SegmentBase(const QORA_Variable& first) { return mbPrefix(first.GetKey(), kBaseBytes); }
 
 std::string Base36(unsigned n) {
     static const char kDigits[] = "0123456789ABCDEFGHIJKLMNOPQRSTUVWXYZ";
@@ -71,9 +65,9 @@ void Split(QORA_DataSource& source, const HeaderSettings& settings) {
         const std::string base = SegmentBase(whole);
         source.DeleteVariables(index, index);
         unsigned counter = 0;
-        for (int j = 0; j < SegmentCount(width); ++j) {
+        for (int j = 0; j < Plan::SegmentCount(width); ++j) {
             QORA_Variable segment = whole;
-            Retype(segment, SegmentWidth(width, j));
+            Retype(segment, Plan::SegmentWidth(width, j));
             if (j > 0) {
                 std::string name;
                 do name = base + Base36(counter++);
@@ -89,10 +83,10 @@ void Split(QORA_DataSource& source, const HeaderSettings& settings) {
 // width that no earlier entry took; if so they are taken now.
 bool TakeSegments(const QORA_DataSource& source, int index, int width, std::vector<bool>& taken) {
     if (width <= kMaxShortString || width > QORA_Variable::MAX_STRING_TYPE) return false;
-    const int count = SegmentCount(width);
+    const int count = Plan::SegmentCount(width);
     if (count > source.ColumnCount() - index) return false;
     const std::string base = SegmentBase(source.GetVariable(index));
-    const int full = width / kSegmentChars, rest = width % kSegmentChars;
+    const int full = width / int(Plan::kSureBytes), rest = width % int(Plan::kSureBytes);
     for (int j = 0; j < count; ++j) {
         const QORA_Variable& segment = source.GetVariable(index + j);
         if (taken[size_t(index + j)]) return false;
@@ -175,7 +169,7 @@ void Merge(QORA_DataSource& source, const StringWidths& strings) {
         const auto [index, width] = *it;
         QORA_Variable whole = source.GetVariable(index);
         Retype(whole, width);
-        source.DeleteVariables(index, index + SegmentCount(width) - 1);
+        source.DeleteVariables(index, index + Plan::SegmentCount(width) - 1);
         source.InsertVariable(index, whole);
     }
 }

@@ -21,9 +21,9 @@ enum : size_t {
     kUnit = 8,
     kNameSize = 8,
     kMaxValueLabel = 255,
-    kSegmentBytes = 256,
-    kSegmentText = 255,
-    kSegmentWidth = 252,  // a segment holds at least this much of its string
+    kSegmentBytes = SystemFileDechunker::kSegmentBytes,
+    kSegmentText = SystemFileDechunker::kSegmentWidth,
+    kSegmentWidth = SystemFileDechunker::kSureBytes,  // a segment holds at least this much
 };
 // What a continuation record carries as its print and write formats.
 const int32_t kContinuationFormat = 0x00011D01;

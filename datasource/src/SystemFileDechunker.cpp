@@ -6,20 +6,16 @@
 
 namespace {
 
-enum : uint32_t {
-    kUnit = 8,
-    kSegmentBytes = 256,  // a full segment in the file
-    kSegmentWidth = 255,  // the bytes of a full segment that can hold the string
-    kSureBytes = 252,     // bytes every full segment gives the string
-};
+enum : uint32_t { kUnit = 8 };
 
 // Bytes 252 to 254 of a full segment belong to the string up to the last
 // one that is not NUL: a writer fills with NULs rather than cut a character.
 uint32_t SegmentShare(const unsigned char* segment) {
-    for (uint32_t n = kSegmentWidth; n > kSureBytes; --n) {
+    using Plan = SystemFileDechunker;
+    for (uint32_t n = Plan::kSegmentWidth; n > Plan::kSureBytes; --n) {
         if (segment[n - 1] != 0) return n;
     }
-    return kSureBytes;
+    return Plan::kSureBytes;
 }
 
 }  // namespace

@@ -19,6 +19,16 @@ class SystemFileDechunker {
         uint32_t ordinaryUnits;
     };
 
+    // How a file stores a string wider than kSegmentWidth: as segment
+    // variables, each full one of width kSegmentWidth (kSegmentBytes in the
+    // case) carrying at least kSureBytes of the string, and a last one of
+    // width W mod kSureBytes when that is not 0.
+    enum : uint32_t { kSegmentBytes = 256, kSegmentWidth = 255, kSureBytes = 252 };
+    static int SegmentCount(int width) { return (width + kSureBytes - 1) / kSureBytes; }
+    // The width of segment j (0-based) of a string of the width.
+    static int SegmentWidth(int width, int j) {
+        return j < int(width / kSureBytes) ? int(kSegmentWidth) : int(width % kSureBytes);
+    }
     // Units a string of the width takes in the file, as segments.
     static uint32_t FileUnits(uint32_t width);
     // Units it takes in the dictionary's case.

@@ -147,7 +147,7 @@ std::string TranscodingDataSource::Convert(const std::string& text, int maxBytes
     const int n = fDirection.convert(cnv, &converted[0], size, text.data(), Length(text), &error);
     converted.resize(size_t(std::clamp(n, 0, size)));
     if (maxBytes >= 0 && converted.size() > size_t(maxBytes)) {
-        converted.resize(std::strlen(mbTruncate(&converted[0], maxBytes)));
+        converted = mbPrefix(converted, size_t(maxBytes));
         error = 1;
     }
     if (error != 0) _my->_lossy = true;

@@ -113,9 +113,8 @@ std::string NameKey(std::string_view name) {
 using SetIndex = std::unordered_map<std::string, size_t>;
 
 std::string MemberKey(const std::string& name) {
-    std::string cut = name.substr(0, kMemberKeyBytes);
-    mbTruncate(cut.data(), static_cast<int>(kMemberKeyBytes));
-    return MakeLookupKey(cut.c_str(), std::char_traits<char>::length(cut.c_str()));
+    const std::string cut = mbPrefix(name, kMemberKeyBytes);
+    return MakeLookupKey(cut.data(), cut.size());
 }
 
 // A later line naming an earlier set takes that set's place.
