@@ -12,8 +12,6 @@
 
 namespace {
 
-enum { kMaxNameSize = 64 };
-
 // Whether a name can stand as it is: valid characters only, and no leading
 // character that marks a scratch or system name.
 bool IsAcceptableName(const std::string& name) {
@@ -35,10 +33,10 @@ void LowerCaseNames(QORA_DataSource& source) {
     for (int i = 0; i < source.ColumnCount(); ++i) {
         QORA_Variable& var = source.GetVariable(i);
         const std::string& name = var.GetName();
-        char lower[kMaxNameSize + 1] = {};
+        char lower[kMaxNameBytes + 1] = {};
         int error = 0;
-        const int n = mbToLower(name.data(), int(name.size()), lower, kMaxNameSize, &error);
-        var.SetName(lower, size_t(std::clamp(n, 0, int(kMaxNameSize))));
+        const int n = mbToLower(name.data(), int(name.size()), lower, kMaxNameBytes, &error);
+        var.SetName(lower, size_t(std::clamp(n, 0, int(kMaxNameBytes))));
     }
 }
 

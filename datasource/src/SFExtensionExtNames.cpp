@@ -12,12 +12,13 @@
 #include "SystemFileExtensionRecord.h"
 #include "datasrc.h"
 #include "dserror.h"
+#include "namerules.h"
 #include "qoramb.h"
 #include "variableset.h"
 
 namespace {
 
-enum : size_t { kShortNameBytes = 8, kMaxNameBytes = 64 };
+enum : size_t { kShortNameBytes = 8 };
 
 using NameList = std::vector<std::pair<std::string, std::string>>;
 // First name to second name; of two entries with one first name, the first wins.

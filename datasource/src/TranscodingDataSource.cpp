@@ -5,6 +5,7 @@
 #include <cstring>
 
 #include "dserror.h"
+#include "namerules.h"
 #include "qoramb.h"
 #include "variableset.h"
 
@@ -12,7 +13,7 @@ namespace {
 
 // Names and the file label are cut to what the calls hand out: a converted
 // text must not grow past the caller's buffer.
-enum { kMaxNameBytes = 64, kMaxLabelBytes = 64, kMissingBytes = 8 };
+enum { kMaxLabelBytes = 64, kMissingBytes = 8 };
 
 int TripleWidth(int width) { return 3 * width > 32766 ? 32767 : 3 * width; }
 int SameWidth(int width) { return width; }

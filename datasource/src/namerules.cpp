@@ -24,7 +24,7 @@ bool IsAsciiNameChar(unsigned char c) {
 
 int QORA_CheckVariableName(const char* name, size_t length) {
     while (length > 0 && name[length - 1] == ' ') --length;
-    if (length == 0 || length > 64) return kNameBadLength;
+    if (length == 0 || length > kMaxNameBytes) return kNameBadLength;
     for (size_t pos = 0; pos < length;) {
         int n = mbCharLength(name + pos, length - pos);
         if (n <= 0 || static_cast<size_t>(n) > length - pos) return kNameBadChar;

@@ -4,6 +4,9 @@
 
 #include <cstddef>
 
+// The longest name, in bytes.
+enum : size_t { kMaxNameBytes = 64 };
+
 // Results of QORA_CheckVariableName.
 enum {
     kNameValid = 0,

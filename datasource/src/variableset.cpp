@@ -7,12 +7,10 @@
 
 #include "datasrc.h"
 #include "dserror.h"
+#include "namerules.h"
 #include "qoramb.h"
 
 namespace {
-
-// Member names are matched against variables on their first bytes only.
-constexpr size_t kMemberKeyBytes = 64;
 
 // Walks one line. Every step checks the bytes that are really there, so a
 // damaged line fails a step instead of driving a read past its end.
@@ -112,8 +110,9 @@ std::string NameKey(std::string_view name) {
 // Where each set of a family sits in the list, by name key.
 using SetIndex = std::unordered_map<std::string, size_t>;
 
+// Member names are matched against variables on their first bytes only.
 std::string MemberKey(const std::string& name) {
-    const std::string cut = mbPrefix(name, kMemberKeyBytes);
+    const std::string cut = mbPrefix(name, kMaxNameBytes);
     return MakeLookupKey(cut.data(), cut.size());
 }
 
