@@ -8,6 +8,7 @@
 #include <ctime>
 #include <set>
 #include <string>
+#include <unordered_map>
 
 #include "CompressedSystemFile.h"
 #include "SystemFileHeader.h"
@@ -191,13 +192,20 @@ void WriteVariable(const QORA_Variable& var, RecordBytes& out) {
     }
 }
 
-// One type 3 record per map, and a type 4 record naming every variable that
-// holds that very map (equal contents are not enough).
+// One type 3 record per map, in the order the maps first appear, and a type 4
+// record naming every variable that holds that very map (equal contents are
+// not enough). One pass: a dictionary of many variables stays linear.
 void WriteValueLabels(const QORA_DataSource& dict, RecordBytes& out) {
-    std::vector<bool> served(size_t(dict.ColumnCount()), false);
+    std::vector<std::pair<QORA_VLMap, std::vector<int32_t>>> groups;
+    std::unordered_map<const QORA_VLMapImpl*, size_t> groupOf;
     for (int i = 0; i < dict.ColumnCount(); ++i) {
         const QORA_VLMap map = dict.GetVariable(i).GetValueLabels();
-        if (served[size_t(i)] || !map.IsValid()) continue;
+        if (!map.IsValid()) continue;
+        const auto found = groupOf.emplace(map.Impl(), groups.size());
+        if (found.second) groups.emplace_back(map, std::vector<int32_t>());
+        groups[found.first->second].second.push_back(1 + dict.ValueOffset(i));
+    }
+    for (const auto& [map, slots] : groups) {
         const auto& pairs = map.Impl()->Pairs();
         out.Int(kValueLabelRecord);
         out.Int(int32_t(pairs.size()));
@@ -208,12 +216,6 @@ void WriteValueLabels(const QORA_DataSource& dict, RecordBytes& out) {
             out.Raw(&length, 1);
             out.Raw(pair.label.data(), n);
             out.Blanks((n + kUnit) / kUnit * kUnit - 1 - n);
-        }
-        std::vector<int32_t> slots;
-        for (int j = i; j < dict.ColumnCount(); ++j) {
-            if (!dict.GetVariable(j).GetValueLabels().SameObject(map)) continue;
-            served[size_t(j)] = true;
-            slots.push_back(1 + dict.ValueOffset(j));
         }
         out.Int(kValueLabelVarsRecord);
         out.Int(int32_t(slots.size()));
