@@ -137,12 +137,13 @@ def run(cmd, cwd, timeout):
         return None
 
 
-def first_failure(build):
+def failures(build):
+    """The tests the last run failed, in the order ctest lists them."""
     try:
         with open(os.path.join(build, "Testing", "Temporary", "LastTestsFailed.log")) as f:
-            return f.readline().strip().split(":", 1)[-1]
+            return [line.strip().split(":", 1)[-1] for line in f if line.strip()]
     except OSError:
-        return "a timeout"
+        return []
 
 
 def object_of(build, path):
@@ -205,6 +206,10 @@ def main():
     parser.add_argument("--build", default=os.path.join(ROOT, "build-mutate"))
     parser.add_argument("--jobs", default="2")
     parser.add_argument("--list", action="store_true", help="print the sample and stop")
+    parser.add_argument("--kills", metavar="FILE",
+                        help="run every test against every mutant and write, one line per "
+                             "mutant, the tests that kill it (slower; shows which tests "
+                             "nothing else can replace)")
     parser.add_argument("--only", metavar="LOG",
                         help="try only the sampled mutants named in LOG (a run's output)")
     args = parser.parse_args()
@@ -223,8 +228,10 @@ def main():
     configure(build)
     restore_leftovers(build)
     build_cmd = ["cmake", "--build", build, "-j", args.jobs, "--target"] + TARGETS
-    test_cmd = ["ctest", "--timeout", "60", "-j", args.jobs, "--stop-on-failure",
-                "-E", "InstallAndBuildExamples"]
+    test_cmd = ["ctest", "--timeout", "60", "-j", args.jobs, "-E", "InstallAndBuildExamples"]
+    if not args.kills:
+        test_cmd.append("--stop-on-failure")
+    kills = open(args.kills, "w", encoding="utf-8") if args.kills else None
     if run(build_cmd, ROOT, None) != 0 or run(test_cmd, build, None) != 0:
         print("the unchanged sources do not build or pass their tests")
         return 1
@@ -242,7 +249,10 @@ def main():
                 verdict = "SURVIVED"
             else:
                 killed.append(where)
-                verdict = "killed by " + first_failure(build)
+                failed = failures(build) or ["a timeout"]
+                verdict = "killed by " + failed[0]
+                if kills:
+                    print("\t".join([where] + failed), file=kills, flush=True)
         print(f"[{i}/{len(sample)}] {where}: {verdict}", flush=True)
     run(build_cmd, ROOT, None)
 
