@@ -4,6 +4,7 @@
 #include <gtest/gtest.h>
 
 #include <algorithm>
+#include <array>
 #include <cstring>
 #include <map>
 #include <random>
@@ -153,18 +154,18 @@ std::string Expected(const Spec& s) {
     return out;
 }
 
-class RoundTrip : public ::testing::TestWithParam<unsigned> {};
-INSTANTIATE_TEST_SUITE_P(Seeds, RoundTrip, ::testing::Range(1u, 9u));
-
-TEST_P(RoundTrip, DictionaryAndCasesComeBackExactly) {
-    Generator g(GetParam());
-    const bool compressed = GetParam() % 2 == 0;
-    std::set<std::string> keys;
+struct Dataset {
     std::vector<Spec> specs;
-    for (int i = g.Int(1, 24); i > 0; --i) specs.push_back(g.Variable(keys));
-    std::vector<std::vector<std::string>> rows(size_t(g.Int(0, 12)));
-    for (auto& row : rows) {
-        for (const Spec& s : specs) {
+    std::vector<std::vector<std::string>> rows;  // "" is system-missing or blank
+};
+
+Dataset Generate(Generator& g) {
+    Dataset d;
+    std::set<std::string> keys;
+    for (int i = g.Int(1, 24); i > 0; --i) d.specs.push_back(g.Variable(keys));
+    d.rows.resize(size_t(g.Int(0, 12)));
+    for (auto& row : d.rows) {
+        for (const Spec& s : d.specs) {
             // Strings come back blank-padded, so trailing blanks cannot tell.
             std::string text = s.type == 0
                                    ? (g.Int(0, 4) ? NumberKey(g.Int(-1000, 1000) / 8.0) : "")
@@ -173,45 +174,97 @@ TEST_P(RoundTrip, DictionaryAndCasesComeBackExactly) {
             row.push_back(text);
         }
     }
+    return d;
+}
 
-    fixture::TempDir dir;
-    const std::string path = dir.Path() + "/rt.qsf";
-    {
-        OpenHandle h;
-        fixture::OpenForWrite(path, h);
-        for (const Spec& s : specs) Define(h.get(), s);
-        ASSERT_EQ(qoraSetCompression(h.get(), compressed), QORA_STATUS_OK);
-        ASSERT_EQ(qoraCommitHeader(h.get()), QORA_STATUS_OK);
-        for (const auto& row : rows) {
-            for (size_t i = 0; i < specs.size(); ++i) {
-                const double var = double(i + 1);
-                const int status =
-                    specs[i].type == 0
-                        ? qoraSetValueNumeric(h.get(), var,
-                                              row[i].empty() ? qoraSysmisVal() : std::stod(row[i]))
-                        : qoraSetValueChar(h.get(), var, row[i].c_str());
-                ASSERT_EQ(status, QORA_STATUS_OK);
-            }
-            ASSERT_EQ(qoraCommitCaseRecord(h.get()), QORA_STATUS_OK);
+void WriteThroughCalls(const std::string& path, const Dataset& d, bool compressed) {
+    OpenHandle h;
+    fixture::OpenForWrite(path, h);
+    for (const Spec& s : d.specs) Define(h.get(), s);
+    ASSERT_EQ(qoraSetCompression(h.get(), compressed), QORA_STATUS_OK);
+    ASSERT_EQ(qoraCommitHeader(h.get()), QORA_STATUS_OK);
+    for (const auto& row : d.rows) {
+        for (size_t i = 0; i < d.specs.size(); ++i) {
+            const double var = double(i + 1);
+            const int status =
+                d.specs[i].type == 0
+                    ? qoraSetValueNumeric(h.get(), var,
+                                          row[i].empty() ? qoraSysmisVal() : std::stod(row[i]))
+                    : qoraSetValueChar(h.get(), var, row[i].c_str());
+            ASSERT_EQ(status, QORA_STATUS_OK);
         }
-        ASSERT_EQ(qoraCloseWrite(h.get()), QORA_STATUS_OK);
-        h.Forget();
+        ASSERT_EQ(qoraCommitCaseRecord(h.get()), QORA_STATUS_OK);
     }
+    ASSERT_EQ(qoraCloseWrite(h.get()), QORA_STATUS_OK);
+    h.Forget();
+}
 
+// The same dataset laid out by the fixture builder, as another writer could:
+// short names of its own, long names, segments, display triples, value
+// labels of numbers and short strings in type 3 records, of longer strings
+// in the long value labels record.
+void Describe(fixture::SysFileBuilder& b, const Dataset& d) {
+    std::vector<std::array<int32_t, 3>> display;
+    std::vector<fixture::LongValueLabels> longLabels;
+    // Type 3 records may only follow the last variable.
+    std::vector<std::pair<std::vector<std::pair<fixture::Value, std::string>>, int>> shortLabels;
+    for (size_t i = 0; i < d.specs.size(); ++i) {
+        const Spec& s = d.specs[i];
+        const std::string shortName = "V" + std::to_string(i);
+        fixture::Var& v = s.type == 0 ? b.Numeric(shortName) : b.String(shortName, s.type);
+        v.LongName(s.name);
+        if (!s.label.empty()) v.Label(s.label);
+        if (s.missingCount > 0) v.Missing({s.missing, s.missing + s.missingCount});
+        if (s.missingCount == -2) v.MissingRange(s.missing[0], s.missing[1]);
+        if (s.missingCount == -3) v.MissingRange(s.missing[0], s.missing[1], s.missing[2]);
+        for (int seg = s.type > 255 ? (s.type + 251) / 252 : 1; seg > 0; --seg)
+            display.push_back({s.level, s.columns, s.alignment});
+        if (s.labels.empty()) continue;
+        std::vector<std::pair<fixture::Value, std::string>> pairs;
+        fixture::LongValueLabels wide{s.name, s.type, {}};
+        for (const auto& [value, label] : s.labels) {
+            if (s.type == 0) pairs.emplace_back(std::stod(value), label);
+            if (s.type > 0) pairs.emplace_back(value, label);
+            if (s.type > 8)
+                wide.labels.emplace_back(value + std::string(size_t(s.type) - value.size(), ' '),
+                                         label);
+        }
+        if (s.type <= 8) shortLabels.emplace_back(pairs, v.Slot());
+        if (s.type > 8) longLabels.push_back(wide);
+    }
+    for (const auto& [pairs, slot] : shortLabels) b.ValueLabels(pairs, {slot});
+    b.DisplayParams(display);
+    b.LongNames();
+    // An empty record would be malformed.
+    if (std::any_of(d.specs.begin(), d.specs.end(), [](const Spec& s) { return s.type > 255; }))
+        b.VeryLongStrings();
+    if (!longLabels.empty()) b.LongValueLabelsRecord(longLabels);
+    for (const auto& row : d.rows) {
+        std::vector<fixture::Value> values;
+        for (size_t i = 0; i < d.specs.size(); ++i) {
+            if (d.specs[i].type > 0) values.emplace_back(row[i]);
+            if (d.specs[i].type == 0)
+                values.emplace_back(row[i].empty() ? fixture::kSysmis : std::stod(row[i]));
+        }
+        b.Case(values);
+    }
+}
+
+void ExpectReadsBack(const std::string& path, const Dataset& d) {
     OpenHandle h;
     fixture::OpenForRead(path, h);
     int count = -1;
     ASSERT_EQ(qoraGetNumberofVariables(h.get(), &count), QORA_STATUS_OK);
-    ASSERT_EQ(count, int(specs.size()));
+    ASSERT_EQ(count, int(d.specs.size()));
     ASSERT_EQ(qoraGetNumberofCases(h.get(), &count), QORA_STATUS_OK);
-    EXPECT_EQ(count, int(rows.size()));
-    for (const Spec& s : specs) EXPECT_EQ(Described(h.get(), s), Expected(s));
+    EXPECT_EQ(count, int(d.rows.size()));
+    for (const Spec& s : d.specs) EXPECT_EQ(Described(h.get(), s), Expected(s));
     std::vector<char> text(32768);
-    for (const auto& row : rows) {
+    for (const auto& row : d.rows) {
         ASSERT_EQ(qoraReadCaseRecord(h.get()), QORA_STATUS_OK);
-        for (size_t i = 0; i < specs.size(); ++i) {
+        for (size_t i = 0; i < d.specs.size(); ++i) {
             std::string got;
-            if (specs[i].type == 0) {
+            if (d.specs[i].type == 0) {
                 double value = 0;
                 ASSERT_EQ(qoraGetValueNumeric(h.get(), double(i + 1), &value), QORA_STATUS_OK);
                 got = value == qoraSysmisVal() ? "" : NumberKey(value);
@@ -221,10 +274,31 @@ TEST_P(RoundTrip, DictionaryAndCasesComeBackExactly) {
                 got = text.data();
                 got.erase(got.find_last_not_of(' ') + 1);
             }
-            EXPECT_EQ(got, row[i]) << specs[i].name;
+            EXPECT_EQ(got, row[i]) << d.specs[i].name;
         }
     }
     EXPECT_EQ(qoraReadCaseRecord(h.get()), QORA_WARN_END_OF_FILE);
+}
+
+// Each seed writes its dataset through the calls and through the fixture
+// builder; the seeds between them cover both forms and both byte orders.
+class RoundTrip : public ::testing::TestWithParam<unsigned> {};
+INSTANTIATE_TEST_SUITE_P(Seeds, RoundTrip, ::testing::Range(1u, 9u));
+
+TEST_P(RoundTrip, DictionaryAndCasesComeBackExactly) {
+    Generator g(GetParam());
+    const bool compressed = GetParam() % 2 == 0;
+    const Dataset d = Generate(g);
+    fixture::TempDir dir;
+    const std::string path = dir.Path() + "/rt.qsf";
+    WriteThroughCalls(path, d, compressed);
+    ExpectReadsBack(path, d);
+
+    fixture::SysFileBuilder b(GetParam() % 4 < 2 ? fixture::Endian::Native
+                                                 : fixture::Endian::Swapped);
+    b.Compressed(compressed);
+    Describe(b, d);
+    ExpectReadsBack(b.WriteTemp(), d);
 }
 
 }  // namespace
