@@ -8,7 +8,6 @@
 #include <memory>
 #include <vector>
 
-#include "SystemFileDataSource.h"
 #include "api_handles.h"
 #include "handletable.h"
 #include "memory_source.h"
@@ -226,28 +225,6 @@ TEST(AccessChecks, DefineCallsOnReadAndAppendHandles) {
     const int handle = InsertEntry(std::make_unique<MemorySource>(), AppendMode);
     EXPECT_EQ(qoraSetVarName(handle, "Y", 0), QORA_STATUS_DICT_COMMITTED);
     EXPECT_EQ(qoraCloseAppend(handle), QORA_STATUS_OK);
-}
-
-TEST(FileEntryTables, DuplicateNamesAreRefused) {
-    auto source = std::make_unique<MemorySource>();
-    source->Add(0, "Age");
-    source->Add(12, "Name");
-    FileEntry entry(std::move(source), ReadMode);
-    ASSERT_EQ(entry.BuildNameIndex(), QORA_STATUS_OK);
-    static_cast<MemorySource&>(*entry.fpDataSource).Add(0, "AGE");
-    EXPECT_EQ(entry.BuildNameIndex(), QORA_STATUS_BAD_FILE);
-}
-
-TEST(FileEntryTables, SystemFileViewFallsBackToTheParent) {
-    SystemFileDataSource parent;
-    auto child = std::make_unique<MemorySource>();
-    child->SetParent(&parent);
-    const FileEntry entry(std::move(child), ReadMode);
-    EXPECT_FALSE(entry.HasSystemFile());
-    EXPECT_EQ(entry.SystemFileOrParent(), &parent);
-    EXPECT_EQ(FileEntry(std::make_unique<MemorySource>(), ReadMode).SystemFileOrParent(), nullptr);
-    const FileEntry own(std::make_unique<SystemFileDataSource>(), WriteMode);
-    EXPECT_EQ(own.SystemFileOrParent(), own.fpSystemFile);
 }
 
 }  // namespace

@@ -155,14 +155,22 @@ std::string Expected(const Spec& s) {
 }
 
 struct Dataset {
+    std::string label;  // the file label
+    int weight;         // index of the weight variable, or -1
     std::vector<Spec> specs;
     std::vector<std::vector<std::string>> rows;  // "" is system-missing or blank
 };
 
 Dataset Generate(Generator& g) {
     Dataset d;
+    d.label = g.Text(g.Int(0, 64), "file label ");
+    d.label.erase(d.label.find_last_not_of(' ') + 1);
     std::set<std::string> keys;
     for (int i = g.Int(1, 24); i > 0; --i) d.specs.push_back(g.Variable(keys));
+    // The first numeric variable weighs the cases, most of the time.
+    const auto numeric =
+        std::find_if(d.specs.begin(), d.specs.end(), [](const Spec& s) { return s.type == 0; });
+    d.weight = numeric != d.specs.end() && g.Int(0, 3) ? int(numeric - d.specs.begin()) : -1;
     d.rows.resize(size_t(g.Int(0, 12)));
     for (auto& row : d.rows) {
         for (const Spec& s : d.specs) {
@@ -181,7 +189,13 @@ void WriteThroughCalls(const std::string& path, const Dataset& d, bool compresse
     OpenHandle h;
     fixture::OpenForWrite(path, h);
     for (const Spec& s : d.specs) Define(h.get(), s);
-    ASSERT_EQ(qoraSetCompression(h.get(), compressed), QORA_STATUS_OK);
+    // Any nonzero compression code means compressed.
+    ASSERT_EQ(qoraSetCompression(h.get(), compressed ? 5 : 0), QORA_STATUS_OK);
+    ASSERT_EQ(qoraSetIdString(h.get(), d.label.c_str()), QORA_STATUS_OK);
+    if (d.weight >= 0) {
+        ASSERT_EQ(qoraSetCaseWeightVar(h.get(), d.specs[size_t(d.weight)].name.c_str()),
+                  QORA_STATUS_OK);
+    }
     ASSERT_EQ(qoraCommitHeader(h.get()), QORA_STATUS_OK);
     for (const auto& row : d.rows) {
         for (size_t i = 0; i < d.specs.size(); ++i) {
@@ -212,6 +226,7 @@ void Describe(fixture::SysFileBuilder& b, const Dataset& d) {
         const Spec& s = d.specs[i];
         const std::string shortName = "V" + std::to_string(i);
         fixture::Var& v = s.type == 0 ? b.Numeric(shortName) : b.String(shortName, s.type);
+        if (int(i) == d.weight) b.Weight(v);
         v.LongName(s.name);
         if (!s.label.empty()) v.Label(s.label);
         if (s.missingCount > 0) v.Missing({s.missing, s.missing + s.missingCount});
@@ -250,16 +265,24 @@ void Describe(fixture::SysFileBuilder& b, const Dataset& d) {
     }
 }
 
-void ExpectReadsBack(const std::string& path, const Dataset& d) {
+void ExpectReadsBack(const std::string& path, const Dataset& d, bool compressed) {
     OpenHandle h;
     fixture::OpenForRead(path, h);
+    char text[65];
+    ASSERT_EQ(qoraGetIdString(h.get(), text), QORA_STATUS_OK);
+    std::string label = text;
+    EXPECT_EQ(label.erase(label.find_last_not_of(' ') + 1), d.label);
+    EXPECT_EQ(qoraGetCaseWeightVar(h.get(), text), d.weight < 0 ? QORA_WARN_NO_WEIGHT : 0);
+    EXPECT_EQ(text, d.weight < 0 ? "" : d.specs[size_t(d.weight)].name);
     int count = -1;
+    ASSERT_EQ(qoraGetCompression(h.get(), &count), QORA_STATUS_OK);
+    EXPECT_EQ(count, compressed ? 1 : 0);
     ASSERT_EQ(qoraGetNumberofVariables(h.get(), &count), QORA_STATUS_OK);
     ASSERT_EQ(count, int(d.specs.size()));
     ASSERT_EQ(qoraGetNumberofCases(h.get(), &count), QORA_STATUS_OK);
     EXPECT_EQ(count, int(d.rows.size()));
     for (const Spec& s : d.specs) EXPECT_EQ(Described(h.get(), s), Expected(s));
-    std::vector<char> text(32768);
+    std::vector<char> value(32768);
     for (const auto& row : d.rows) {
         ASSERT_EQ(qoraReadCaseRecord(h.get()), QORA_STATUS_OK);
         for (size_t i = 0; i < d.specs.size(); ++i) {
@@ -269,9 +292,9 @@ void ExpectReadsBack(const std::string& path, const Dataset& d) {
                 ASSERT_EQ(qoraGetValueNumeric(h.get(), double(i + 1), &value), QORA_STATUS_OK);
                 got = value == qoraSysmisVal() ? "" : NumberKey(value);
             } else {
-                ASSERT_EQ(qoraGetValueChar(h.get(), double(i + 1), text.data(), int(text.size())),
+                ASSERT_EQ(qoraGetValueChar(h.get(), double(i + 1), value.data(), int(value.size())),
                           QORA_STATUS_OK);
-                got = text.data();
+                got = value.data();
                 got.erase(got.find_last_not_of(' ') + 1);
             }
             EXPECT_EQ(got, row[i]) << d.specs[i].name;
@@ -292,13 +315,14 @@ TEST_P(RoundTrip, DictionaryAndCasesComeBackExactly) {
     fixture::TempDir dir;
     const std::string path = dir.Path() + "/rt.qsf";
     WriteThroughCalls(path, d, compressed);
-    ExpectReadsBack(path, d);
+    ExpectReadsBack(path, d, compressed);
 
     fixture::SysFileBuilder b(GetParam() % 4 < 2 ? fixture::Endian::Native
                                                  : fixture::Endian::Swapped);
     b.Compressed(compressed);
     Describe(b, d);
-    ExpectReadsBack(b.WriteTemp(), d);
+    b.header().label = d.label;
+    ExpectReadsBack(b.WriteTemp(), d, compressed);
 }
 
 }  // namespace

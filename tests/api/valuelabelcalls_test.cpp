@@ -13,9 +13,7 @@
 
 namespace {
 
-using fixture::Endian;
 using fixture::OpenHandle;
-using fixture::SysFileBuilder;
 
 class ValueLabels : public ::testing::Test {
   protected:
@@ -189,46 +187,5 @@ TEST_F(ValueLabels, ArrayCallsClearTheirOutputsOnFailure) {
     EXPECT_EQ(qoraFreeVarNValueLabels(nullptr, nullptr, 5), QORA_STATUS_OK);
     EXPECT_EQ(qoraFreeVarCValueLabels(nullptr, nullptr, 5), QORA_STATUS_OK);
 }
-
-class ValueLabelsFromFile : public ::testing::TestWithParam<Endian> {};
-
-TEST_P(ValueLabelsFromFile, ReadBackInKeyOrder) {
-    SysFileBuilder b(GetParam());
-    b.Numeric("SEX");
-    b.Numeric("OTHER");
-    b.String("CODE", 6);
-    b.ValueLabels({{2.0, "female"}, {1.0, "male"}}, {b.Slot("SEX"), b.Slot("OTHER")});
-    b.ValueLabels({{"AB", "alpha"}, {"ZZZZZZ", "zed"}}, {b.Slot("CODE")});
-    OpenHandle h;
-    fixture::OpenForRead(b.WriteTemp(), h);
-    char label[61];
-    ASSERT_EQ(qoraGetVarNValueLabel(h.get(), "sex", 2.0, label), QORA_STATUS_OK);
-    EXPECT_STREQ(label, "female");
-    ASSERT_EQ(qoraGetVarNValueLabel(h.get(), "other", 1.0, label), QORA_STATUS_OK);
-    EXPECT_STREQ(label, "male");
-    ASSERT_EQ(qoraGetVarCValueLabel(h.get(), "code", "AB", label), QORA_STATUS_OK);
-    EXPECT_STREQ(label, "alpha");
-    EXPECT_EQ(qoraSetVarNValueLabel(h.get(), "sex", 3.0, "x"), QORA_STATUS_OPENED_FOR_READING);
-
-    double* values = nullptr;
-    char** labels = nullptr;
-    int count = 0;
-    ASSERT_EQ(qoraGetVarNValueLabels(h.get(), "SEX", &values, &labels, &count), QORA_STATUS_OK);
-    ASSERT_EQ(count, 2);
-    EXPECT_EQ(values[0], 1.0);
-    EXPECT_STREQ(labels[0], "male");
-    EXPECT_EQ(values[1], 2.0);
-    EXPECT_EQ(qoraFreeVarNValueLabels(values, labels, count), QORA_STATUS_OK);
-    char** strings = nullptr;
-    ASSERT_EQ(qoraGetVarCValueLabels(h.get(), "CODE", &strings, &labels, &count), QORA_STATUS_OK);
-    ASSERT_EQ(count, 2);
-    EXPECT_STREQ(strings[0], "AB      ");
-    EXPECT_STREQ(strings[1], "ZZZZZZ  ");
-    EXPECT_STREQ(labels[1], "zed");
-    EXPECT_EQ(qoraFreeVarCValueLabels(strings, labels, count), QORA_STATUS_OK);
-}
-
-INSTANTIATE_TEST_SUITE_P(Orders, ValueLabelsFromFile,
-                         ::testing::Values(Endian::Native, Endian::Swapped), fixture::EndianName);
 
 }  // namespace

@@ -94,29 +94,6 @@ class WriteCalls : public ::testing::TestWithParam<bool> {
 INSTANTIATE_TEST_SUITE_P(Forms, WriteCalls, ::testing::Bool(),
                          [](const auto& info) { return info.param ? "Compressed" : "Raw"; });
 
-TEST_P(WriteCalls, RoundTripKeepsDictionaryAndCases) {
-    const std::string path = WriteFile(fDir.Path() + "/rt.qsf", GetParam(), Rows(300));
-    ExpectRows(path, Rows(300));
-    OpenHandle h;
-    fixture::OpenForRead(path, h);
-    char text[256];
-    int value = -1;
-    EXPECT_EQ(qoraGetCompression(h.get(), &value), QORA_STATUS_OK);
-    EXPECT_EQ(value, GetParam() ? 1 : 0);
-    EXPECT_EQ(qoraGetIdString(h.get(), text), QORA_STATUS_OK);
-    EXPECT_STREQ(text, "Round trip");
-    EXPECT_EQ(qoraGetCaseWeightVar(h.get(), text), QORA_STATUS_OK);
-    EXPECT_STREQ(text, "Amount");
-    EXPECT_EQ(qoraGetVarLabel(h.get(), "amount", text), QORA_STATUS_OK);
-    EXPECT_STREQ(text, "Amount paid");
-    EXPECT_EQ(qoraGetVarNValueLabel(h.get(), "amount", 1.0, text), QORA_STATUS_OK);
-    EXPECT_STREQ(text, "One");
-    EXPECT_EQ(qoraGetVarCValueLabel(h.get(), "code", "c1", text), QORA_STATUS_OK);
-    EXPECT_STREQ(text, "First");
-    EXPECT_EQ(qoraGetSystemString(h.get(), text), QORA_STATUS_OK);
-    EXPECT_STREQ(text, "MS Windows Release 16.0 qoraio32.dll");
-}
-
 // Appended cases follow the ones already there (the compressed form continues
 // its half-filled last block), and a copy starts with its source's dictionary.
 TEST_P(WriteCalls, AppendAndCopy) {
