@@ -248,6 +248,8 @@ void Describe(fixture::SysFileBuilder& b, const Dataset& d) {
         if (s.type > 8) longLabels.push_back(wide);
     }
     for (const auto& [pairs, slot] : shortLabels) b.ValueLabels(pairs, {slot});
+    b.IntegerInfo();
+    b.FloatInfo();
     b.DisplayParams(display);
     b.LongNames();
     // An empty record would be malformed.
@@ -303,6 +305,20 @@ void ExpectReadsBack(const std::string& path, const Dataset& d, bool compressed)
     EXPECT_EQ(qoraReadCaseRecord(h.get()), QORA_WARN_END_OF_FILE);
 }
 
+// A long name whose two-byte character would end at byte 65 is cut before it.
+TEST(LongNames, AreCutAtAWholeCharacter) {
+    fixture::Utf8Mode utf8;
+    fixture::SysFileBuilder b(fixture::Endian::Swapped);
+    b.Numeric("M").LongName(std::string(63, 'm') + "\xC3\xA9o");
+    b.LongNames();
+    OpenHandle h;
+    fixture::OpenForRead(b.WriteTemp(), h);
+    char name[65];
+    int type = -1;
+    ASSERT_EQ(qoraGetVarInfo(h.get(), 0, name, &type), QORA_STATUS_OK);
+    EXPECT_EQ(name, std::string(63, 'm'));
+}
+
 // Each seed writes its dataset through the calls and through the fixture
 // builder; the seeds between them cover both forms and both byte orders.
 class RoundTrip : public ::testing::TestWithParam<unsigned> {};
@@ -321,6 +337,10 @@ TEST_P(RoundTrip, DictionaryAndCasesComeBackExactly) {
                                                  : fixture::Endian::Swapped);
     b.Compressed(compressed);
     Describe(b, d);
+    if (GetParam() % 3 == 0) {  // the count only in the 64-bit record
+        b.header().caseCount = -1;
+        b.CaseCount64(int64_t(d.rows.size()));
+    }
     b.header().label = d.label;
     ExpectReadsBack(b.WriteTemp(), d, compressed);
 }
