@@ -30,8 +30,9 @@ void WriteExtras(const std::string& path, bool compressed, int documents) {
     fixture::OpenForWrite(path, h);
     const int w = h.get();
     Define(w);
-    const char* const attributeNames[] = {"Note[1]", "Note[2]", "Owner", ""};
-    const char* const attributeTexts[] = {"a", "b", "me", "skipped"};
+    // Note[3] to Note[9] stay empty: they are not handed out.
+    const char* const attributeNames[] = {"Note[1]", "Note[2]", "Note[10]", "Owner", ""};
+    const char* const attributeTexts[] = {"a", "b", "c", "me", "skipped"};
     const int statuses[] = {qoraSetCompression(w, compressed),
                             qoraCopyDocuments(documents, w),
                             qoraSetTextInfo(w, "text info"),
@@ -42,7 +43,7 @@ void WriteExtras(const std::string& path, bool compressed, int documents) {
                             qoraAddMultRespDefN(w, "$dich", "Yes", 1, 1, kNumbers, 2),
                             qoraSetVariableSets(w, "Both= q1 s1\n"),
                             qoraSetDateVariables(w, int(kDates.size()), kDates.data()),
-                            qoraSetFileAttributes(w, attributeNames, attributeTexts, 4),
+                            qoraSetFileAttributes(w, attributeNames, attributeTexts, 5),
                             qoraAddFileAttribute(w, "$CreationDate", -1, "2026"),
                             qoraAddVarAttribute(w, "q1", "Unit", -1, "kg"),
                             qoraSetExtensionData(w, 30, 4, 2, kRaw),
@@ -101,7 +102,8 @@ std::string ReadExtras(const std::string& path) {
 
 const std::string kExtras =
     "01|0text info|0{guid}|08,1|0abcd\x01|03|02|$cat:0,0,:s1 s2 |$dich:1,1,1:q1 q2 |0Both= q1 "
-    "s1\n|0:0 1 1 3 4 1 1 2 1 6 11 1 |0Note[1]=a;Note[2]=b;Owner=me;$CreationDate=2026;|0Unit=kg;"
+    "s1\n|0:0 1 1 3 4 1 1 2 1 6 11 1 "
+    "|0Note[01]=a;Note[02]=b;Note[10]=c;Owner=me;$CreationDate=2026;|0Unit=kg;"
     "|04,2|02:7,9";
 
 class Extras : public ::testing::TestWithParam<bool> {};
@@ -152,6 +154,7 @@ TEST(ExtrasCalls, Statuses) {
     const char* const twice[] = {"q1", " Q1"};
     const char* const mixed[] = {"q1", "s1"};
     const char* const badSubscript[] = {"a[x]"};
+    char** names = nullptr;
     qoraMultRespDef disagreeing{};
     std::string("$bad").copy(disagreeing.name, 4);
     qoraMultRespDef labelled = disagreeing;
@@ -194,6 +197,8 @@ TEST(ExtrasCalls, Statuses) {
         {qoraAddVarAttribute(w, "q1", "$ODBC.Type", -1, "t"), 0},
         {qoraSetFileAttributes(w, nullptr, nullptr, 1), 76},
         {qoraSetFileAttributes(w, badSubscript, badSubscript, 1), 75},
+        {qoraGetVarAttributes(r, "nope", &names, &names, &x), 12},
+        {qoraGetFileAttributes(-1, &names, &names, &x), 5},
         {qoraSetDateVariables(w, 5, kDates.data()), 45},
         {qoraSetDateVariables(w, 9, Ints{0, 1, 1, 1, 1, 1, 99, 2, 1}.data()), 45},
         {qoraSetDateVariables(w, 9, Ints{0, 1, 1, 1, 1, 1, 2, 2, 1}.data()), 45},
