@@ -13,56 +13,6 @@ bool Parse(Attributes& target, const std::string& text, size_t* pos = nullptr) {
     return target.FromText(text.data(), text.size(), pos);
 }
 
-TEST(AttributesTest, SetRemoveAndChangeCount) {
-    Attributes a;
-    a.Set("Size", {"1"});
-    a.Set("Colour", {"red"});
-    a.Set("SIZE", {"2", "3"});  // case ignored, latest spelling kept
-    ASSERT_EQ(a.Size(), 2);
-    EXPECT_EQ(a.NameAt(0), "SIZE");
-    EXPECT_EQ(a.ValuesAt(0), (Attributes::Values{"2", "3"}));
-    EXPECT_EQ(a.IndexOf("colour"), 1);
-    EXPECT_TRUE(a.ValuesOf("none").empty());
-    EXPECT_THROW(a.NameAt(2), ErrorText);
-    EXPECT_THROW(a.ValuesAt(-1), ErrorText);
-    EXPECT_THROW(a.RemoveAt(2), ErrorText);
-    EXPECT_FALSE(a.Remove("y"));
-    EXPECT_TRUE(a.Remove("colour"));
-    EXPECT_EQ(a.ChangeCount(), 4u);
-    Attributes copy(a);  // a copy counts as one more change
-    EXPECT_EQ(copy.ChangeCount(), 5u);
-    copy.Assign(Attributes());
-    EXPECT_EQ(copy.ChangeCount(), 6u);
-    EXPECT_TRUE(copy == Attributes());
-    EXPECT_EQ(copy.ToText(), "");
-    copy = a;
-    EXPECT_EQ(copy.ChangeCount(), 7u);
-}
-
-TEST(AttributesTest, EqualityCountsCaseAndMergeReplacesOnlyWhenAsked) {
-    Attributes a, b;
-    a.Set("x", {"1"});
-    b.Set("X", {"1"});
-    EXPECT_FALSE(a == b);
-    b.Set("x", {"1"});
-    EXPECT_TRUE(a == b);
-    a.Set("y", {"1"});
-    b.Set("y", {"1", "2"});
-    EXPECT_TRUE(a != b);
-    b.Set("y", {"1"});
-
-    a.Set("keep", {"old"});
-    b.Set("KEEP", {"new"});
-    b.Set("add", {"1"});
-    EXPECT_TRUE(a.Merge(b, false));
-    EXPECT_EQ(a.ValuesOf("keep"), (Attributes::Values{"old"}));
-    EXPECT_EQ(a.Size(), 4);
-    EXPECT_FALSE(a.Merge(b, false));
-    EXPECT_TRUE(a.Merge(b, true));
-    EXPECT_EQ(a.ValuesOf("keep"), (Attributes::Values{"new"}));
-    EXPECT_FALSE(a.Merge(b, true));
-}
-
 TEST(AttributesTest, TextFormBytesAndRoundTrip) {
     Attributes a;
     a.Set("Size", {"1", "2"});
@@ -168,14 +118,6 @@ TEST(AttributesTest, NameRulesAndClasses) {
         EXPECT_EQ(Attributes::ClassifyName(name.data(), name.size(), var), result) << name;
     EXPECT_EQ(Attributes::VariableReservedNames().size(), 14u);
     EXPECT_EQ(Attributes::FileReservedNames().size(), 9u);
-
-    const std::tuple<int, int, const char*> presented[] = {{1, 1, "Size"},
-                                                           {7, 12, "Size[07]"},
-                                                           {12, 12, "Size[12]"},
-                                                           {5, 100, "Size[005]"},
-                                                           {2, 9, "Size[2]"}};
-    for (const auto& [index, count, result] : presented)
-        EXPECT_EQ(Attributes::PresentedName("Size", index, count), result);
 }
 
 TEST(AttributesTest, MultibyteNamesInUtf8Mode) {

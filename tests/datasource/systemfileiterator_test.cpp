@@ -82,17 +82,6 @@ TEST_P(SystemFileIteratorTest, IteratorsReadIndependentlyAndAreCounted) {
     EXPECT_EQ(source->LiveIterators(), 0);
 }
 
-TEST_P(SystemFileIteratorTest, FillsTheCallersBuffer) {
-    Open(2);
-    auto buffer = std::make_unique<double[]>(4);
-    IteratorPtr own(source->NewIterator(buffer.get()));
-    ASSERT_TRUE(own->ReadCase());
-    own.reset();
-    EXPECT_EQ(buffer[0], 0.0);
-    EXPECT_EQ(std::memcmp(&buffer[1], "case 0          ", 16), 0);
-    EXPECT_EQ(buffer[3], ExpectedY(0));
-}
-
 TEST_P(SystemFileIteratorTest, APlanThatLeavesTheCaseIsRefusedWhenTheIteratorIsMade) {
     Open(1);
     it.reset();
@@ -123,76 +112,6 @@ TEST_P(SystemFileIteratorTest, DataEndingInsideACaseIsAnErrorEveryTime) {
     EXPECT_EQ(ReadFailure(*it), expected);
     ASSERT_TRUE(it->SeekCase(1));
     ExpectCase(1);
-}
-
-// ------------------------------------------------------------- hand-made blocks
-
-namespace {
-
-class CompressedBlocksTest : public ByteOrders {
-  protected:
-    void SetUp() override {
-        b = SysFileBuilder(GetParam());
-        b.Compressed();
-        b.header().caseCount = -1;
-    }
-    void Open() {
-        it.reset();  // an iterator goes before its source
-        source = OpenFixture(b.WriteTemp());
-        it.reset(source->NewIterator(nullptr));
-    }
-    SysFileBuilder b;
-    std::unique_ptr<SystemFileDataSource> source;
-    IteratorPtr it;
-};
-
-INSTANTIATE_TEST_SUITE_P(Orders, CompressedBlocksTest,
-                         ::testing::Values(Endian::Native, Endian::Swapped), EndianName);
-
-}  // namespace
-
-TEST_P(CompressedBlocksTest, ControlBytesCutShortAreAnError) {
-    b.Numeric("X");
-    b.Data(b.Block({101, 102, 0, 0, 0, 0, 0, 0}, {}));
-    b.Data({103, 104, 105});
-    Open();
-    for (double x : {1.0, 2.0}) {
-        ASSERT_TRUE(it->ReadCase());
-        EXPECT_EQ(Number(*it, 0), x);
-    }
-    EXPECT_EQ(ReadFailure(*it), "1205 nRead == 0");
-}
-
-TEST_P(CompressedBlocksTest, DataEndingInsideACaseAreAnError) {
-    b.Numeric("X");
-    b.Numeric("Y");
-    b.String("S", 20);
-    b.Numeric("Z");
-    // One whole case of 6 cells, then 3 cells of the next.
-    b.Data(b.Block({101, 102, 254, 254, 254, 103, 104, 105}, {}));
-    b.Data(b.Block({254, 0, 0, 0, 0, 0, 0, 0}, {}));
-    Open();
-    ASSERT_TRUE(it->ReadCase());
-    EXPECT_EQ(Number(*it, 3), 3.0);
-    EXPECT_EQ(ReadFailure(*it), "1205 iCell == 0");
-    // Positioning over the cut case meets the same end.
-    ASSERT_TRUE(it->SeekCase(5));
-    EXPECT_EQ(ReadFailure(*it), "1205 iCell == 0");
-}
-
-// Raw numbers are reversed for a file of the other order; codes are bytes.
-TEST_P(CompressedBlocksTest, RawCellsFollowTheFileOrderAndStringsNever) {
-    b.Numeric("X");
-    b.String("S", 8);
-    b.Data(b.Block({253, 253, 255, 254, 0, 0, 0, 0}, {Value(1e300), Value("ABCDEFGH")}));
-    Open();
-    ASSERT_TRUE(it->ReadCase());
-    EXPECT_EQ(Number(*it, 0), 1e300);
-    EXPECT_EQ(Text(*it, 1, 8), "ABCDEFGH");
-    ASSERT_TRUE(it->ReadCase());
-    EXPECT_EQ(Number(*it, 0), kSysmis);
-    EXPECT_EQ(Text(*it, 1, 8), "        ");
-    EXPECT_FALSE(it->ReadCase());
 }
 
 // 24-byte cases never line up with the read-ahead or the stream's blocks.
