@@ -87,7 +87,7 @@ TEST(AttributesTest, MangledTextNeverReadsOutside) {
     }
 }
 
-TEST(AttributesTest, NameRulesAndClasses) {
+TEST(AttributesTest, NameRules) {
     const std::pair<std::string, int> names[] = {{"age", 0},
                                                  {"age   ", 0},
                                                  {"", 3},
@@ -105,19 +105,6 @@ TEST(AttributesTest, NameRulesAndClasses) {
                                                  {"a.b_c", 0}};
     for (const auto& [name, result] : names)
         EXPECT_EQ(Attributes::CheckName(name.data(), name.size()), result) << name;
-
-    const std::tuple<std::string, bool, int> classes[] = {{"age", true, 1},
-                                                          {"$ODBC.Type", true, 2},
-                                                          {"$odbc.type", true, 2},
-                                                          {"$ODBC.Type", false, 3},
-                                                          {"$ExtendedFileLabel", false, 2},
-                                                          {"$Unknown", true, 3},
-                                                          {"#scratch", true, 0},
-                                                          {"age.", false, 0}};
-    for (const auto& [name, var, result] : classes)
-        EXPECT_EQ(Attributes::ClassifyName(name.data(), name.size(), var), result) << name;
-    EXPECT_EQ(Attributes::VariableReservedNames().size(), 14u);
-    EXPECT_EQ(Attributes::FileReservedNames().size(), 9u);
 }
 
 TEST(AttributesTest, MultibyteNamesInUtf8Mode) {

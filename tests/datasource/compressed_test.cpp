@@ -1,5 +1,4 @@
-// Compressed case data: the codes both encoders write, malformed data, random
-// bytes, and positioning over the blocks.
+// Compressed case data: the codes both encoders write, malformed data, random bytes.
 #include <gtest/gtest.h>
 
 #include <cstring>
@@ -127,20 +126,6 @@ TEST(CompressedCodes, BothEncodersWriteTheCodesOfTheLayout) {
     EXPECT_TRUE(Encode(3, {}).empty());
 }
 
-TEST(CompressedRoundTrip, MixedCasesDecodeToTheSameBytes) {
-    std::mt19937 rng(7);
-    const Value pool[] = {0.0, -99.0,      151.0, 0.5, -0.0, 1e10, fixture::kSysmis,
-                          "",  "abcdefgh", 42.0};
-    // The last form spans many writes of collected blocks.
-    for (auto [units, count] : {std::pair{1u, 50}, {3u, 50}, {8u, 50}, {13u, 50}, {13u, 5000}}) {
-        std::vector<std::vector<Unit>> cases(count, std::vector<Unit>(units));
-        for (auto& one : cases) {
-            for (auto& u : one) u = UnitOf(pool[rng() % 10]);
-        }
-        EXPECT_EQ(cases, DecodeAll(units, Encode(units, cases))) << units;
-    }
-}
-
 TEST(CompressedRead, PaddingAndCode252EndBlocks) {
     MemFile m({101, 102, 103, 0, 0, 0, 0, 0});
     CompressedSystemFile c(1, &m.index, &m.file, kHeader);
@@ -200,49 +185,4 @@ TEST(CompressedRead, RandomBytesNeverCrashOrHang) {
         const std::string raised = Raised([&] { DecodeAll(1 + rng() % 9, data); });
         EXPECT_TRUE(raised == "nothing" || raised.rfind(kShort, 0) == 0) << raised;
     }
-}
-
-// Cases of 3 units whose raw values land all over the blocks.
-std::vector<std::vector<Unit>> Numbered(int count) {
-    std::vector<std::vector<Unit>> cases;
-    for (int i = 0; i < count; ++i)
-        cases.push_back({UnitOf(i), UnitOf(i + 0.5), UnitOf(i % 3 ? 1 : 0.75)});
-    return cases;
-}
-
-TEST(CompressedPosition, TellAndSeekReturnToEveryCase) {
-    const auto cases = Numbered(40);
-    MemFile m(Encode(3, cases));
-    CompressedSystemFile c(3, &m.index, &m.file, kHeader);
-    std::vector<int64_t> starts;
-    std::vector<Unit> out(3);
-    for (size_t i = 0; i < cases.size(); ++i) {
-        starts.push_back(c.Tell());
-        ASSERT_EQ(3u, c.ReadCase(out.data(), nullptr));
-    }
-    // 120 cells fill 15 blocks: after the last case no block is loaded and
-    // the position names where a next block would start.
-    EXPECT_EQ(static_cast<int64_t>(m.Data().size()), c.Tell());
-    for (size_t i = cases.size(); i-- > 0;) {
-        c.Seek(starts[i]);
-        EXPECT_EQ(starts[i], c.Tell());
-        ASSERT_EQ(3u, c.ReadCase(out.data(), nullptr));
-        EXPECT_EQ(cases[i], out) << i;
-    }
-    c.Seek(static_cast<int64_t>(m.Data().size()));
-    EXPECT_EQ(0u, c.ReadCase(out.data(), nullptr));
-}
-
-TEST(CompressedAppend, KeepsRawValuesAndFillsIntoNewBlocks) {
-    const auto first = Numbered(5);  // 15 cells: the last block is partly used
-    MemFile m(Encode(3, first));
-    {
-        CompressedSystemFile c(3, &m.index, &m.file, kHeader);
-        c.PrepareAppend(5);
-        for (const auto& one : Numbered(9)) c.WriteCase(one.data());
-        c.Finish();
-    }
-    auto expect = first;
-    for (const auto& one : Numbered(9)) expect.push_back(one);
-    EXPECT_EQ(Encode(3, expect), m.Data());  // the same bytes as writing all in one go
 }

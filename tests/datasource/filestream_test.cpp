@@ -1,5 +1,5 @@
-// The buffered file stream under every read and write: mixed sizes, append,
-// failures and positions beyond 32 bits.
+// The buffered file stream under every read and write: mixed sizes, append
+// and positions beyond 32 bits.
 #include "filestream.h"
 
 #include <gtest/gtest.h>
@@ -9,7 +9,6 @@
 #include <cstdio>
 #include <cstring>
 #include <fstream>
-#include <functional>
 #include <string>
 #include <vector>
 
@@ -84,58 +83,6 @@ TEST_F(FileStreamTest, AppendModeStartsAtEnd) {
     std::vector<char> expect = Pattern(700);
     expect.insert(expect.end(), {'e', 'n', 'd'});
     EXPECT_EQ(expect, Get(Path("a")));
-}
-
-TEST_F(FileStreamTest, ClosedStreamAndNegativePositionsAnswerQuietly) {
-    QORA_FileStream s;
-    char buf[4];
-    EXPECT_EQ(nullptr, s.Name());
-    EXPECT_EQ(0u, s.Read(buf, 4));
-    EXPECT_EQ(0u, s.Write(buf, 4));
-    EXPECT_EQ(-1, s.Seek(0, 0));
-    EXPECT_FALSE(s.Commit());
-    EXPECT_FALSE(s.Open(Path("missing").c_str(), "rb"));
-    EXPECT_FALSE(s.IsGood());
-
-    Put(Path("n"), Pattern(10));
-    QORA_FileStream n(Path("n").c_str(), "rb");
-    EXPECT_EQ(0, n.Seek(-5, 0));
-    EXPECT_EQ(0u, n.Read(buf, 4));
-    EXPECT_TRUE(n.IsGood());
-}
-
-void ExpectError(long number, const std::function<void()>& action) {
-    try {
-        action();
-        ADD_FAILURE() << "no error " << number;
-    } catch (const ErrorText& e) {
-        EXPECT_NE(std::string::npos, e.Text().find("Datasource error # " + std::to_string(number)))
-            << e.Text();
-    }
-}
-
-TEST_F(FileStreamTest, FailuresRaiseStreamErrors) {
-    ExpectError(kErrStreamOpen, [&] { QORA_FileStream s(Path("missing").c_str(), "rb"); });
-
-    Put(Path("ro"), Pattern(10));
-    QORA_FileStream readOnly(Path("ro").c_str(), "rb");
-    std::vector<char> big = Pattern(5000);
-    ExpectError(kErrStreamWrite, [&] { readOnly.Write(big.data(), 5000); });
-    EXPECT_FALSE(readOnly.IsGood());
-    readOnly.ClearError();
-    EXPECT_TRUE(readOnly.IsGood());
-    readOnly.Seek(0, 0);
-    readOnly.Write("x", 1);  // buffered: the failure shows at the flush
-    ExpectError(kErrStreamWrite, [&] { readOnly.Flush(); });
-
-    QORA_FileStream writeOnly(Path("wo").c_str(), "wb");
-    char buf[4];
-    ExpectError(kErrStreamRead, [&] { writeOnly.Read(buf, 4); });
-    EXPECT_FALSE(writeOnly.IsGood());
-
-    QORA_FileStream negative(Path("neg").c_str(), "wb");
-    negative.Seek(-1, 0);
-    ExpectError(kErrStreamWrite, [&] { negative.Write("x", 1); });
 }
 
 TEST_F(FileStreamTest, PositionsBeyondFourGigabytes) {

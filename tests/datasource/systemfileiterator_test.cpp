@@ -1,3 +1,5 @@
+// Reading cases of files in both byte orders, raw and compressed: a random walk
+// of reads and seeks against a model.
 #include <gtest/gtest.h>
 
 #include <algorithm>
@@ -27,16 +29,6 @@ std::string Text(const QORA_InputCaseIterator& it, int index, size_t width) {
     return std::string(static_cast<const char*>(it.ValuePointer(index)), width);
 }
 
-// The condition of the SystemFileException a read raises; empty when none.
-std::string ReadFailure(QORA_InputCaseIterator& it) {
-    try {
-        it.ReadCase();
-    } catch (const SystemFileException& e) {
-        return std::to_string(e.Number()) + " " + e.Condition();
-    }
-    return "";
-}
-
 class SystemFileIteratorTest : public ::testing::TestWithParam<DataForm> {
   protected:
     SystemFileIteratorTest() : b(std::get<0>(GetParam())) { b.Compressed(std::get<1>(GetParam())); }
@@ -64,73 +56,6 @@ class SystemFileIteratorTest : public ::testing::TestWithParam<DataForm> {
 INSTANTIATE_TEST_SUITE_P(Forms, SystemFileIteratorTest, AllDataForms(), DataFormName);
 
 }  // namespace
-
-TEST_P(SystemFileIteratorTest, IteratorsReadIndependentlyAndAreCounted) {
-    Open(4);
-    EXPECT_EQ(source->LiveIterators(), 1);
-    {
-        IteratorPtr other(source->NewIterator(nullptr));
-        EXPECT_EQ(source->LiveIterators(), 2);
-        ExpectCase(0);
-        ExpectCase(1);
-        ASSERT_TRUE(other->ReadCase());
-        EXPECT_EQ(Number(*other, 0), 0.0);
-        ExpectCase(2);
-    }
-    EXPECT_EQ(source->LiveIterators(), 1);
-    it.reset();
-    EXPECT_EQ(source->LiveIterators(), 0);
-}
-
-TEST_P(SystemFileIteratorTest, APlanThatLeavesTheCaseIsRefusedWhenTheIteratorIsMade) {
-    Open(1);
-    it.reset();
-    auto plan = std::make_unique<SystemFileDechunker>();
-    plan->Add(SystemFileDechunker::StringEntry(1, 300, 1, 1));
-    source->Settings().fpDechunker = std::move(plan);
-    try {
-        it.reset(source->NewIterator(nullptr));
-        FAIL() << "made an iterator over a plan beyond the case";
-    } catch (const SystemFileException& e) {
-        EXPECT_EQ(e.Number(), kErrBadFormat);
-    }
-    EXPECT_EQ(source->LiveIterators(), 0);
-}
-
-TEST_P(SystemFileIteratorTest, DataEndingInsideACaseIsAnErrorEveryTime) {
-    StandardCases(b, 3);
-    Bytes bytes = b.Build();
-    // The last case loses its final unit (a raw value when compressed).
-    const std::string path = b.WriteTemp(Truncated(bytes, bytes.size() - 8), "cut.qsf");
-    source = OpenFixture(path);
-    it.reset(source->NewIterator(nullptr));
-    ExpectCase(0);
-    ExpectCase(1);
-    const std::string expected = std::get<1>(GetParam()) ? "1205 nRead == nu*sizeof(OBS)"
-                                                         : "1205 readLen== 0 || readLen == caseLen";
-    EXPECT_EQ(ReadFailure(*it), expected);
-    EXPECT_EQ(ReadFailure(*it), expected);
-    ASSERT_TRUE(it->SeekCase(1));
-    ExpectCase(1);
-}
-
-// 24-byte cases never line up with the read-ahead or the stream's blocks.
-TEST_P(SystemFileIteratorTest, CasesStraddlingTheReadAheadArriveWhole) {
-    const int n = 15000;
-    b.Numeric("X");
-    b.String("S", 9);
-    for (int i = 0; i < n; ++i) b.Case({i * 0.5, std::to_string(i)});
-    source = OpenFixture(b.WriteTemp());
-    it.reset(source->NewIterator(nullptr));
-    for (int i = 0; i < n; ++i) {
-        ASSERT_TRUE(it->ReadCase());
-        ASSERT_EQ(Number(*it, 0), i * 0.5);
-        const std::string digits = std::to_string(i);
-        ASSERT_EQ(Text(*it, 1, 16), digits + std::string(16 - digits.size(), ' '));
-    }
-    EXPECT_FALSE(it->ReadCase());
-    EXPECT_EQ(source->CaseCount(), n);
-}
 
 // A random walk of reads and seeks against a model of where the iterator
 // stands, over every kind of header count: exact, unknown, too high, too low.

@@ -1,7 +1,5 @@
-// Date variable information: the record read from fixture bytes in both
-// byte orders and written back unit for unit, the checks a hostile record
-// meets, and the repairs against a changed dictionary.
-#include "trendsinfo.h"
+// Date variable information: the checks a hostile record meets, in both byte
+// orders.
 
 #include <gtest/gtest.h>
 
@@ -26,21 +24,6 @@ SysFileBuilder DateFile(fixture::Endian endian) {
 }
 
 class DateRecord : public ByteOrders {};
-
-TEST_P(DateRecord, ReadsAndWritesTheUnitsOfTheLayout) {
-    SysFileBuilder b = DateFile(GetParam());
-    // Setting 1 (7), 2 date variables, numbers 3 and 4, YEAR_, MONTH_, DATE_.
-    const std::vector<int32_t> units = {1, 7, 2, 3, 4, 1, 1, 2, 1, 4, 4, 12, 5, 11, 1};
-    b.DateInfo(units);
-    auto source = OpenFixture(b.WriteTemp());
-    HeaderSettings settings;
-    SystemFileExtensionRecord record;
-    FindExtensionHandler(kDateInfoExtension)->Export(*source, settings, record);
-    ASSERT_EQ(record.UnitSize(), 4);
-    ASSERT_EQ(record.NUnits(), int32_t(units.size()));
-    for (int32_t k = 0; k < record.NUnits(); ++k)
-        EXPECT_EQ(record.Unit<int32_t>(k, false), units[size_t(k)]) << "unit " << k;
-}
 
 TEST_P(DateRecord, HostileRecordsFailToOpen) {
     const struct {
@@ -70,27 +53,5 @@ TEST_P(DateRecord, HostileRecordsFailToOpen) {
 INSTANTIATE_TEST_SUITE_P(Orders, DateRecord,
                          ::testing::Values(fixture::Endian::Native, fixture::Endian::Swapped),
                          fixture::EndianName);
-
-TEST(DateInfo, ValidateFollowsTheDictionary) {
-    auto source = OpenFixture(DateFile(fixture::Endian::Native).WriteTemp());
-    auto set = [&](int keyIndex) {
-        QORA_TrendsInfo info;
-        info.SetCount(1);
-        info.SetEntry(*source, 0, 0, 2, 1);
-        info.SetEntry(*source, 1, keyIndex, QORA_TrendsInfo::e_DATKEY, 1);
-        return info;
-    };
-    QORA_TrendsInfo info = set(3);
-    source->DeleteVariables(1, 1);  // indexes move; identities stay
-    EXPECT_TRUE(info.Validate(*source));
-    source->DeleteVariables(2, 2);  // the key goes: only the key entry is cleared
-    EXPECT_FALSE(info.Validate(*source));
-    EXPECT_EQ(info.DateVarCount(), 1);
-    EXPECT_EQ(info.GetEntry(1).fType, QORA_TrendsInfo::e_NONE);
-
-    info = set(1);  // MONTH_ is no key: the whole information goes
-    EXPECT_FALSE(info.Validate(*source));
-    EXPECT_EQ(info.DateVarCount(), 0);
-}
 
 }  // namespace

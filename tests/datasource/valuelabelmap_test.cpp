@@ -85,19 +85,3 @@ TEST(VLMapTest, InsertAllEqualsInsertingOneByOne) {
     EXPECT_TRUE(all == oneByOne);
     EXPECT_EQ(all.Count(), 103);  // -50 to 50, -0 and NaN
 }
-
-TEST(VLMapTest, WideKeysHoldOnlyTheirValueAndMixWithOldWidths) {
-    QORA_VLMap map(255);
-    map.InsertAll({{map.KeyFromText("b", 1), "b"}, {map.KeyFromText("a", 1), "a"}});
-    EXPECT_EQ(map.Impl()->Pairs()[0].key, "a       ");
-    EXPECT_EQ(*map.Lookup((std::string("b") + std::string(254, ' ')).c_str(), 255), "b");
-    std::string units, label;
-    map.Reset();
-    ASSERT_EQ(map.Next(units, label), 1);
-    EXPECT_EQ(units, "a" + std::string(255, ' '));
-    // A key stored at a narrower width is found again at the wider one.
-    QORA_VLMap grown(8);
-    grown.Insert("ab", 2, "ab");
-    grown.SetKeyType(20);
-    EXPECT_EQ(*grown.Lookup("ab", 2), "ab");
-}

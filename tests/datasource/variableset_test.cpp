@@ -84,12 +84,6 @@ TEST(VariableSetLine, EachFormWrittenAndReadBack) {
     EXPECT_THROW(LineOf(Set(Set::kMultipleCategory)), ErrorText);
 }
 
-TEST(VariableSetLine, ParsesFlagDigitsAndVariableLists) {
-    EXPECT_EQ(Parsed("$m=E 10 1 7 0  a  b A\r\nignored"), "2|$m|7||1|a b ");
-    EXPECT_EQ(Parsed("$c=C 0  x y\n"), "1|$c|||0|x y ");
-    EXPECT_EQ(Parsed("Set one=p q"), "0|Set one|||0|p q ");
-}
-
 TEST(VariableSetLine, MalformedLinesYieldNothing) {
     const char* lines[] = {
         "$a C 1 L x",                           // no "="
@@ -117,20 +111,6 @@ TEST(VariableSetLine, MalformedLinesYieldNothing) {
     EXPECT_EQ(Parsed(std::string_view(memory).substr(0, 10)), "nothing");
 }
 
-TEST(VariableSet, NamesByCaseCodeAndEditsCheckTheirIndex) {
-    Set set = Make(Set::kVariableSet, "MixEd", "", "", {"Age", "AGE", "sex"});  // case ignored
-    EXPECT_EQ(set.GetName(Set::kLowerCase), "mixed");
-    EXPECT_EQ(set.GetName(Set::kUpperCase), "MIXED");
-    EXPECT_EQ(set.GetName(Set::kAsStored), "MixEd");
-    EXPECT_THROW(set.GetName(3), ErrorText);
-    EXPECT_EQ(Describe(set), "0|MixEd|||0|Age sex ");
-    set.SetVariable(1, "gender");
-    set.RemoveVariable(0);
-    EXPECT_EQ(Describe(set), "0|MixEd|||0|gender ");
-    EXPECT_THROW(set.RemoveVariable(1), ErrorText);
-    EXPECT_THROW(set.SetVariable(1, "x"), ErrorText);
-}
-
 TEST(VariableSetLoad, MultipleResponseFamilyReadsBothRecordsAndMerges) {
     DictionaryOnly source;
     source.SetRecord(kMultRespExtension,
@@ -153,28 +133,6 @@ TEST(VariableSetLoad, MultipleResponseFamilyReadsBothRecordsAndMerges) {
     ASSERT_EQ(plain.size(), 1u);
     EXPECT_EQ(Describe(plain[0]), "0|vs|||0|a b ");
     EXPECT_TRUE(LoadVariableSets(DictionaryOnly(), QORA_SetFamily::kVariableSets).empty());
-}
-
-TEST(VariableSetStore, RoutesEachSetToItsRecordAndRoundTrips) {
-    DictionaryOnly source;
-    source.SetRecord(kVariableSetExtension, "old= x\n");
-    const QORA_VariableSetList sets = {
-        Make(Set::kMultipleDichotomy, "$d", "1 2", "Label", {"a"}),
-        Make(Set::kMultipleDichotomy, "$e", "9", "", {"b"}, Set::kExtendedFlag),
-        Make(Set::kVariableSet, "plain", "", "", {"c"})};
-    StoreVariableSets(source, sets);
-    EXPECT_EQ(source.Record(kMultRespExtension), "$d=D3 1 2 5 Label a\n");
-    EXPECT_EQ(source.Record(kExtendedMultRespExtension), "$e=E 1 1 9 0  b\n");
-    EXPECT_EQ(source.Record(kVariableSetExtension), "plain= c\n");
-    const QORA_VariableSetList mr = LoadVariableSets(source, QORA_SetFamily::kMultipleResponse);
-    ASSERT_EQ(mr.size(), 2u);
-    EXPECT_EQ(Describe(mr[0]), Describe(sets[0]));
-    EXPECT_EQ(Describe(mr[1]), Describe(sets[1]));
-
-    // A record no set has lines for is left as it was.
-    StoreVariableSets(source, {sets[0]});
-    EXPECT_EQ(source.Record(kExtendedMultRespExtension), "$e=E 1 1 9 0  b\n");
-    EXPECT_EQ(source.Record(kVariableSetExtension), "plain= c\n");
 }
 
 TEST(VariableSetPrune, RemovesUnknownNamesThenEmptySets) {
