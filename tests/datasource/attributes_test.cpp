@@ -87,26 +87,6 @@ TEST(AttributesTest, MangledTextNeverReadsOutside) {
     }
 }
 
-TEST(AttributesTest, NameRules) {
-    const std::pair<std::string, int> names[] = {{"age", 0},
-                                                 {"age   ", 0},
-                                                 {"", 3},
-                                                 {std::string(65, 'a'), 3},
-                                                 {std::string(64, 'a'), 0},
-                                                 {"a b", 4},
-                                                 {std::string("a\0b", 3), 4},
-                                                 {"and", 5},
-                                                 {"WITHX", 0},
-                                                 {"_a", 6},
-                                                 {"#a", 1},
-                                                 {"$a.", 2},
-                                                 {"a.", 7},
-                                                 {"a_", 100},
-                                                 {"a.b_c", 0}};
-    for (const auto& [name, result] : names)
-        EXPECT_EQ(Attributes::CheckName(name.data(), name.size()), result) << name;
-}
-
 TEST(AttributesTest, MultibyteNamesInUtf8Mode) {
     const int saved = mbIsUtf8Mode();
     mbSetUtf8Mode(1);

@@ -70,19 +70,4 @@ TEST(Transcoding, CodePageFileSeenInUtf8) {
     EXPECT_EQ(Value(5, 16), zhongUtf8 + "?" + std::string(12, ' '));
 }
 
-TEST(Transcoding, WarningsOfACodePageInterface) {
-    EncodingScope scope(kLatin1);
-    for (const auto& [encoding, number] : {std::pair<std::string, long>{"utf8", kWarnNotCodePage},
-                                           {"windows-1252", kWarnCodePageShown}}) {
-        SysFileBuilder b;
-        b.Numeric("A").Label("\xE4\xB8\xAD");  // no Latin-1 character for it
-        b.Encoding(encoding);
-        Warnings warnings;
-        const auto source = OpenForReading(b.WriteTemp().c_str(), &warnings);
-        EXPECT_EQ(warnings.numbers, std::vector<long>{number}) << encoding;
-        EXPECT_STREQ(source->GetVariable(0).GetLabel(),
-                     number == kWarnNotCodePage ? "?" : "\xE4\xB8\xAD");
-    }
-}
-
 }  // namespace
