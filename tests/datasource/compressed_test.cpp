@@ -1,7 +1,6 @@
 // Compressed case data: the codes both encoders write, malformed data, random bytes.
 #include <gtest/gtest.h>
 
-#include <cstring>
 #include <functional>
 #include <limits>
 #include <random>
@@ -20,21 +19,7 @@ using fixture::Value;
 
 namespace {
 
-using Unit = std::array<unsigned char, 8>;
-
 const int64_t kHeader = 16;  // bytes before the case data in every test file
-
-Unit UnitOf(const Value& value) {
-    Unit u;
-    if (value.IsString()) {
-        const std::string text = (value.Text() + std::string(8, ' ')).substr(0, 8);
-        std::memcpy(u.data(), text.data(), 8);
-    } else {
-        const double number = value.Number();
-        std::memcpy(u.data(), &number, 8);
-    }
-    return u;
-}
 
 // An in-memory file holding a header of kHeader bytes and then the data.
 struct MemFile {
@@ -43,48 +28,50 @@ struct MemFile {
         file.Write(header.data(), kHeader);
         if (!data.empty()) file.Write(data.data(), static_cast<uint32_t>(data.size()));
     }
-    Bytes Data() const { return Bytes(file.Data() + kHeader, file.Data() + file.Size()); }
     QORA_InMemoryFile file;
     SparseFileIndex index;
 };
 
-Bytes Encode(uint32_t units, const std::vector<std::vector<Unit>>& cases) {
+// Cases are the bytes of their units, one after the other.
+Bytes Encode(uint32_t units, const std::vector<Bytes>& cases) {
     MemFile m;
     CompressedSystemFile c(units, &m.index, &m.file, kHeader);
-    for (const auto& one : cases) c.WriteCase(one.data());
+    for (const Bytes& one : cases) c.WriteCase(one.data());
     c.Finish();
-    return m.Data();
+    return Bytes(m.file.Data() + kHeader, m.file.Data() + m.file.Size());
 }
 
-std::vector<std::vector<Unit>> DecodeAll(uint32_t units, const Bytes& data) {
+std::vector<Bytes> DecodeAll(uint32_t units, const Bytes& data) {
     MemFile m(data);
     CompressedSystemFile c(units, &m.index, &m.file, kHeader);
-    std::vector<std::vector<Unit>> cases;
-    std::vector<Unit> one(units);
+    std::vector<Bytes> cases;
+    Bytes one(8 * units);
     while (c.ReadCase(one.data(), nullptr) == units) cases.push_back(one);
     return cases;
 }
 
 // The library's encoder and the fixture builder's write the expected bytes
 // for the cases (numbers and strings of width 8), and they decode back.
-void ExpectBothEncoders(const std::vector<std::vector<Value>>& cases, const Bytes& expected) {
+void ExpectBothEncoders(const std::vector<std::vector<Value>>& rows, const Bytes& expected) {
     fixture::SysFileBuilder b;
     b.Compressed();
-    const std::vector<Value>& first = cases.front();
-    for (size_t i = 0; i < first.size(); ++i) {
-        const std::string name = "V" + std::to_string(i);
-        first[i].IsString() ? b.String(name, 8) : b.Numeric(name);
-    }
-    std::vector<std::vector<Unit>> units;
-    for (const auto& row : cases) {
+    for (size_t i = 0; i < rows.front().size(); ++i)
+        rows.front()[i].IsString() ? b.String("V" + std::to_string(i), 8)
+                                   : b.Numeric("V" + std::to_string(i));
+    std::vector<Bytes> cases;
+    for (const auto& row : rows) {
         b.Case(row);
-        units.emplace_back();
-        for (const Value& value : row) units.back().push_back(UnitOf(value));
+        cases.emplace_back();
+        for (const Value& value : row) {
+            const Bytes unit = b.Unit(value);
+            cases.back().insert(cases.back().end(), unit.begin(), unit.end());
+        }
     }
     const Bytes file = b.Build();
+    const uint32_t units = uint32_t(rows.front().size());
     EXPECT_EQ(Bytes(file.begin() + long(b.DataStart()), file.end()), expected) << "builder";
-    EXPECT_EQ(Encode(uint32_t(first.size()), units), expected) << "library";
-    EXPECT_EQ(DecodeAll(uint32_t(first.size()), expected), units);
+    EXPECT_EQ(Encode(units, cases), expected) << "library";
+    EXPECT_EQ(DecodeAll(units, expected), cases);
 }
 
 // The number and condition of the format error an action raises.
@@ -102,54 +89,41 @@ const std::string kShort = std::to_string(kErrTooShort) + " ";
 
 TEST(CompressedCodes, BothEncodersWriteTheCodesOfTheLayout) {
     const double inf = std::numeric_limits<double>::infinity();
-    const std::pair<Value, int> codes[] = {
-        {0.0, 100},   {-99.0, 1},        {151.0, 251},
-        {100.0, 200}, {1.0, 101},        {fixture::kSysmis, 255},
-        {"", 254},    {"ABCDEFGH", 253}, {"A", 253},
-        {0.5, 253},   {-0.0, 253},       {-100.0, 253},
-        {152.0, 253}, {255.0, 253},      {1.0000001, 253},
-        {-1.5, 253},  {1e300, 253},      {-1e300, 253},
-        {-99.5, 253}, {-100.5, 253},     {151.5, 253},
-        {inf, 253},   {-inf, 253},       {std::numeric_limits<double>::quiet_NaN(), 253}};
+    // clang-format off
+    const std::pair<Value, int> codes[] = {{0.0, 100}, {-99.0, 1}, {151.0, 251}, {100.0, 200},
+        {1.0, 101}, {fixture::kSysmis, 255}, {"", 254}, {"ABCDEFGH", 253}, {"A", 253}, {0.5, 253},
+        {-0.0, 253}, {-100.0, 253}, {152.0, 253}, {255.0, 253}, {1.0000001, 253}, {-1.5, 253},
+        {1e300, 253}, {-1e300, 253}, {-99.5, 253}, {-100.5, 253}, {151.5, 253}, {inf, 253},
+        {-inf, 253}, {std::numeric_limits<double>::quiet_NaN(), 253}};
+    // clang-format on
     for (const auto& [value, code] : codes) {
         SCOPED_TRACE(value.IsString() ? value.Text() : std::to_string(value.Number()));
         Bytes expected = {uint8_t(code), 0, 0, 0, 0, 0, 0, 0};
-        const Unit raw = UnitOf(value);
+        const Bytes raw = fixture::SysFileBuilder().Unit(value);
         if (code == 253) expected.insert(expected.end(), raw.begin(), raw.end());
         ExpectBothEncoders({{value}}, expected);
     }
-    Bytes mixed = {101, 102, 103, 253, 0, 0, 0, 0, 'A', 'B', 'C', 'D', 'E', 'F', 'G', 'H'};
-    ExpectBothEncoders({{1.0, 2.0, 3.0, "ABCDEFGH"}}, mixed);
+    ExpectBothEncoders({{1.0, 2.0, 3.0, "ABCDEFGH"}},
+                       {101, 102, 103, 253, 0, 0, 0, 0, 'A', 'B', 'C', 'D', 'E', 'F', 'G', 'H'});
     // Nine cells make one full block and one padded one.
     ExpectBothEncoders(std::vector<std::vector<Value>>(9, {1.0}),
                        {101, 101, 101, 101, 101, 101, 101, 101, 101, 0, 0, 0, 0, 0, 0, 0});
     EXPECT_TRUE(Encode(3, {}).empty());
 }
 
-TEST(CompressedRead, PaddingAndCode252EndBlocks) {
-    MemFile m({101, 102, 103, 0, 0, 0, 0, 0});
-    CompressedSystemFile c(1, &m.index, &m.file, kHeader);
-    Unit u;
-    for (double want : {1.0, 2.0, 3.0}) {
-        ASSERT_EQ(1u, c.ReadCase(u.data(), nullptr));
-        EXPECT_EQ(UnitOf(want), u);
-    }
-    EXPECT_EQ(0u, c.ReadCase(u.data(), nullptr));
-    EXPECT_TRUE(c.AtEnd());
-    EXPECT_EQ(3, c.CurrentCase());
-    EXPECT_EQ(0u, c.ReadCase(u.data(), nullptr));  // and stays at the end
-    EXPECT_TRUE(DecodeAll(2, Bytes(64, 0)).empty());
-    EXPECT_TRUE(DecodeAll(2, Bytes(64, 252)).empty());
-
-    // 252 at the start, in the middle and at the end of blocks; the codes
-    // after it (253 among them) have no raw values.
+// 252 at the start, in the middle and at the end of blocks ends them; the
+// codes after it (253 among them) have no raw values.
+TEST(CompressedRead, Code252EndsItsBlock) {
     Bytes data = {101, 252, 253, 253, 102, 102, 102, 102, 252, 253, 253, 253,
                   253, 253, 253, 253, 103, 253, 104, 105, 106, 107, 108, 252};
-    const Unit quarter = UnitOf(0.25);
+    const Bytes quarter = fixture::SysFileBuilder().Unit(0.25);
     data.insert(data.end(), quarter.begin(), quarter.end());
-    std::vector<std::vector<Unit>> expect;
-    for (double x : {1.0, 3.0, 0.25, 4.0, 5.0, 6.0, 7.0, 8.0}) expect.push_back({UnitOf(x)});
+    std::vector<Bytes> expect;
+    for (double x : {1.0, 3.0, 0.25, 4.0, 5.0, 6.0, 7.0, 8.0})
+        expect.push_back(fixture::SysFileBuilder().Unit(x));
     EXPECT_EQ(expect, DecodeAll(1, data));
+    EXPECT_TRUE(DecodeAll(2, Bytes(64, 0)).empty());
+    EXPECT_TRUE(DecodeAll(2, Bytes(64, 252)).empty());
 }
 
 TEST(CompressedRead, MalformedDataRaiseTooShort) {

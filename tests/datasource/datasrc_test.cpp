@@ -1,11 +1,10 @@
-// The case layout of a data source after variables are deleted: the very
-// long string records delete segments at the front, in the middle and at the
-// end of a dictionary.
+// The case layout and the split of a data source after variables are deleted:
+// the very long string records delete segments anywhere in a dictionary.
 #include "datasrc.h"
 
 #include <gtest/gtest.h>
 
-#include <utility>
+#include <tuple>
 
 namespace {
 
@@ -32,11 +31,16 @@ TEST(DataSourceTest, DeletesKeepTheLayoutExact) {
     Source ds;
     int index = -1;
     for (int type : {0, 12, 0, 30, 9, 0}) ds.NewVariable(type, &index);
-    // The front, the last two, all but the first, and the only one left.
-    for (auto [first, last] : {std::pair{0, 0}, {3, 4}, {1, 2}, {0, 0}}) {
+    const int split[] = {4, 5};
+    ds.SetSplitVars(2, split, true);
+    // The front, the last two (the split goes), all but the first, the only one left.
+    const std::tuple<int, int, uint32_t> deletes[] = {{0, 0, 2}, {3, 4, 0}, {1, 2, 0}, {0, 0, 0}};
+    for (auto [first, last, splitCount] : deletes) {
         SCOPED_TRACE(first);
         ds.DeleteVariables(first, last);
         ExpectExactLayout(ds);
+        EXPECT_EQ(ds.SplitVarCount(), splitCount);
+        EXPECT_EQ(ds.IsSplitSorted(), splitCount > 0);
     }
     EXPECT_EQ(ds.ColumnCount(), 0);
 }

@@ -1,13 +1,14 @@
 // The records with handlers of their own, read from files of both byte
-// orders: values out of range, texts that do not parse, malformed records.
+// orders: values out of range, texts that do not parse, malformed records
+// (the date variable information among them).
 #include <gtest/gtest.h>
 
 #include <array>
 #include <string>
 #include <tuple>
 #include <utility>
+#include <vector>
 
-#include "SFExtensionEncoding.h"
 #include "SystemFileExtensionRecord.h"
 #include "reader_support.h"
 
@@ -73,7 +74,17 @@ TEST_P(ExtensionRecordFiles, CaseCountFollowsItsMarkerAndOnlyRises) {
     }
 }
 
+// Every file has YEAR_, NAME (two units), MONTH_ and DATE_, for the date
+// variable information.
 TEST_P(ExtensionRecordFiles, MalformedRecordsFailTheOpen) {
+    auto file = [&] {
+        SysFileBuilder b(GetParam());
+        b.Numeric("YEAR_");
+        b.String("NAME", 12);
+        b.Numeric("MONTH_");
+        b.String("DATE_", 10);
+        return b;
+    };
     const std::tuple<int32_t, int32_t, int32_t, std::string> rows[] = {
         {kIntegerInfoExtension, 4, 7, "rec.NUnits() == 8"},
         {kIntegerInfoExtension, 8, 8, "rec.UnitSize() == 4"},
@@ -85,12 +96,26 @@ TEST_P(ExtensionRecordFiles, MalformedRecordsFailTheOpen) {
         {kCaseCountExtension, 8, 3, "rec.NUnits() == 1 || rec.NUnits() == 2"},
         {kFileAttributesExtension, 2, 4, "rec.UnitSize() == sizeof(char)"},
         {kEncodingExtension, 2, 3, "rec.UnitSize() == sizeof(char)"},
+        {kDateInfoExtension, 8, 6, "rec.UnitSize() == 4"},
     };
     for (const auto& [subtype, unitSize, nUnits, condition] : rows) {
-        SysFileBuilder b(GetParam());
-        b.Numeric("A");
-        b.Numeric("B");
+        SysFileBuilder b = file();
         b.Extension(subtype, unitSize, Bytes(size_t(unitSize * nUnits), 1));
+        const OpenFailure f = FailureOf(b);
+        EXPECT_EQ(std::tie(f.number, f.condition), std::make_tuple(kErrBadFormat, condition));
+    }
+    const std::pair<std::vector<int32_t>, std::string> dates[] = {
+        {{0, 1, 11, 1, 1, 1}, "0 <= nDateVars && nDateVars < QORA_TrendsInfo::eMaxDateVars"},
+        {{0, 1, 4, 1, 1, 1, 1, 2, 1, 4, 4, 1, 0, 0, 0}, "nElements >= 3*nDateVars+6"},
+        {{0, 1, 0, 1, 1, 0, 0, 0, 0, 0, 0, 0}, "nElements <= 3*nDateVars+9"},
+        {{0, 1}, "nElements >= kFixedUnits"},
+        {{0, 1, 1, 1, 1, 1, 6, 2, 1, 0, 0, 0}, "iVar < nVars"},
+        {{0, 1, 1, 1, 1, 1, 1, 2, 1, 4, 4, 1},
+         "iDateVar < nDateVars || iType == e_DATKEY || iType == e_NONE"},
+    };
+    for (const auto& [units, condition] : dates) {
+        SysFileBuilder b = file();
+        b.DateInfo(units);
         const OpenFailure f = FailureOf(b);
         EXPECT_EQ(std::tie(f.number, f.condition), std::make_tuple(kErrBadFormat, condition));
     }

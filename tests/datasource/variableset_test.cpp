@@ -14,9 +14,6 @@ using Set = QORA_VariableSet;
 class DictionaryOnly : public QORA_DataSource {
   public:
     QORA_InputCaseIterator* NewIterator(void*) override { return nullptr; }
-    std::string Record(int32_t type) const {
-        return HasExtension(type) ? GetExtension(type).Impl()->Content() : std::string();
-    }
     void SetRecord(int32_t type, const std::string& text) {
         SetExtensionContent(type, 1, static_cast<int32_t>(text.size()), text.data());
     }
