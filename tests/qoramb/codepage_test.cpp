@@ -1,4 +1,4 @@
-// Encoding names, code page numbers and converters.
+// Encoding names, code page numbers, converters and the runtime locale.
 #include "mbtest.h"
 
 namespace {
@@ -31,10 +31,6 @@ TEST(CodePages, NamesNumbersAndConverters) {
     EXPECT_EQ(ConverterPtr(OpenConverter("123456")), nullptr);  // a name, not a number
     EXPECT_EQ(ConverterPtr(OpenConverter("99998")), nullptr);
     EXPECT_EQ(NameOf(ConverterPtr(OpenConverter("windows-28591")).get()), "ISO-8859-1");
-    {
-        EncodingScope scope({"C", "GBK", 0});
-        EXPECT_EQ(NameOf(ConverterPtr(OpenConverter(nullptr)).get()), NameOf(CurrentConverter()));
-    }
 
     // clang-format off
     const std::pair<const char*, const char*> shown[] = {{"Shift_JIS", "windows-31j"},
@@ -48,12 +44,23 @@ TEST(CodePages, NamesNumbersAndConverters) {
     }
     EncodingScope scope({"C", "ISO-8859-1", 0});
     EXPECT_EQ(EncodingDisplayName(nullptr), "ISO_8859-1:1987");
+    EXPECT_EQ(NameOf(ConverterPtr(OpenConverter(nullptr)).get()), NameOf(CurrentConverter()));
 
     EXPECT_TRUE(IsSameEncoding("cp1252", "windows-1252"));
     EXPECT_TRUE(IsSameEncoding("GBK", "CP936"));
     EXPECT_FALSE(IsSameEncoding("cp1252", "ISO-8859-1"));
     EXPECT_FALSE(IsSameEncoding("no-such-encoding", "no-such-encoding"));
     EXPECT_FALSE(IsSameEncoding(nullptr, "UTF-8"));
+}
+
+// The runtime locale's own locale and encoding, when it names a code page.
+TEST(Locale, SystemLocaleInfo) {
+    std::string locale, encoding;
+    EncodingScope gbk(kGbk);
+    ASSERT_TRUE(GetSystemLocaleInfo(locale, encoding));
+    EXPECT_EQ(locale + " " + encoding, "zh_Hans_CN GBK");
+    EncodingScope none({"C", "ISO-8859-1", 0});
+    EXPECT_FALSE(GetSystemLocaleInfo(locale, encoding));
 }
 
 }  // namespace

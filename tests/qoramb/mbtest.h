@@ -7,7 +7,6 @@
 #include <cstring>
 #include <memory>
 #include <string>
-#include <tuple>
 
 #include "encoding_scope.h"  // with the code page and multibyte routines
 

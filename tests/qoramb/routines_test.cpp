@@ -5,8 +5,7 @@
 
 namespace {
 
-// What a routine makes of the bytes and an argument, as text; size is the
-// size of the destination where the routine fills one.
+// A routine's result as text; size is that of the destination it fills, if any.
 using Routine = std::string (*)(const std::string& bytes, int arg, size_t size);
 
 std::string CharLength(const std::string& bytes, int n, size_t) {
@@ -40,32 +39,29 @@ std::string Padded(const std::string& bytes, int srcLen, size_t size) {
     return std::string(dst.get(), size);
 }
 
-// Lengths, case mapping that keeps the byte length, cuts, searches and copies.
 TEST(Routines, EachRespectsWholeCharacters) {
     const std::tuple<Encoding, Routine, std::string, int, std::string> rows[] = {
         // clang-format off
         {kUtf8, CharLength, "\xC3\xA9", 2, "2"}, {kUtf8, CharLength, "\xA9", 1, "-1"},
-        {kUtf8, CharLength, "\xC3\0"s, 2, "-1"},  // lead byte followed by the terminator
         {kUtf8, CharLength, "\0"s, 5, "0"}, {kUtf8, CharLength, "a", 0, "0"},
         {kUtf8, CharLength, "a", 1, "1"}, {kUtf8, CharLength, "\xF0\x9F\x98\x80", 4, "4"},
-        {kUtf8, CharLength, "\xC0\x80", 2, "-1"},  // overlong
-        {kUtf8, CharLength, "\xE0\x80\x80", 3, "-1"},  // overlong
-        {kUtf8, CharLength, "\xED\xA0\x80", 3, "-1"},  // surrogate
+        // A lead byte before the terminator, overlong forms, a surrogate, beyond U+10FFFF,
+        // bytes that lead nothing, and a character longer than the bytes given.
+        {kUtf8, CharLength, "\xC3\0"s, 2, "-1"}, {kUtf8, CharLength, "\xC0\x80", 2, "-1"},
+        {kUtf8, CharLength, "\xE0\x80\x80", 3, "-1"}, {kUtf8, CharLength, "\xED\xA0\x80", 3, "-1"},
         {kUtf8, CharLength, "\xF4\x90\x80\x80", 4, "-1"}, {kUtf8, CharLength, "\xFE", 1, "-1"},
-        {kUtf8, CharLength, "\xFF", 1, "-1"},
-        {kUtf8, CharLength, "\xE4\xB8", 2, "-1"},  // longer than the bytes given
+        {kUtf8, CharLength, "\xFF", 1, "-1"}, {kUtf8, CharLength, "\xE4\xB8", 2, "-1"},
         {kUtf8, CharLength, "\xE4\xB8\xAD", 3, "3"}, {kCp1252, CharLength, "\xE9", 1, "1"},
         {kGbk, CharLength, "\xD6\xD0", 2, "2"}, {kGbk, CharLength, "a", 1, "1"},
         {kGbk, CharLength, "\xD6", 1, "-1"}, {kGbk, CharLength, "\0"s, 1, "0"},
-        {kUtf8, Mapped, "a\xC4\xB1z", 1, "AIZ "},  // the dotless i upper-cases to one byte
-        {kUtf8, Mapped, "\xC4\xB0X", 0, "ix "},  // capital I with dot lower-cases to one byte
+        // The dotless i upper-cases and the capital I with dot lower-cases to one byte;
+        // a character that would grow, or whose capital the code page lacks, is kept.
+        {kUtf8, Mapped, "a\xC4\xB1z", 1, "AIZ "}, {kUtf8, Mapped, "\xC4\xB0X", 0, "ix "},
         {kUtf8, Mapped, "stra\xC3\x9F\x65 \xC3\xA9t\xC3\xA9", 1,
          "STRA\xC3\x9F\x45 \xC3\x89T\xC3\x89"},
-        {kUtf8, Mapped, "\xC9\x90x", 1, "\xC9\x90X"},  // grows to 3 bytes: kept as it is
-        {kUtf8, Mapped, "a\xFF\xC3", 1, "A\xFF\xC3"},
+        {kUtf8, Mapped, "\xC9\x90x", 1, "\xC9\x90X"}, {kUtf8, Mapped, "a\xFF\xC3", 1, "A\xFF\xC3"},
+        {kCp1252, Mapped, "\xB5m", 1, "\xB5M"}, {kLatin1, Mapped, "\xFF\xE0", 1, "\xFF\xC0"},
         {kCp1252, Mapped, "\xE9t\xE9 \xFF", 1, "\xC9T\xC9 \x9F"},
-        {kCp1252, Mapped, "\xB5m", 1, "\xB5M"},  // micro's capital is not in cp1252: kept, not "?"
-        {kLatin1, Mapped, "\xFF\xE0", 1, "\xFF\xC0"},
         {kGbk, Mapped, "a\xD6\xD0\x62", 1, "A\xD6\xD0\x42"},
         {kUtf8, Truncate, "ab\xC3\xA9z", 3, "ab"},
         {kUtf8, Truncate, "ab\xC3\xA9z", 4, "ab\xC3\xA9"},
@@ -82,12 +78,11 @@ TEST(Routines, EachRespectsWholeCharacters) {
         {kGbk, LastChar, "\xD6\xD0x\xD6\xD0", 0x4E2D, "3"},
         {kUtf8, Bounded, "ab\xC3\xA9\0"s, 0, "ab\0\0"s}, {kUtf8, Bounded, "xyz", 0, "xyz\0"s},
         {kGbk, Bounded, "a\xD6\xD0\0"s, 0, "a\0\0"s}, {kUtf8, Padded, "abc", 3, "abc     "},
-        {kUtf8, Padded, "ab\xC3\xA9", 4, "ab "},
-        {kUtf8, Padded, "ab\xC3\xA9", 3, "ab      "},  // the length cuts the character
-        {kUtf8, Padded, "ab\xC3\xA9", 4, "ab\xC3\xA9    "},
+        // A length that cuts a character leaves it out.
+        {kUtf8, Padded, "ab\xC3\xA9", 4, "ab "}, {kUtf8, Padded, "ab\xC3\xA9", 3, "ab      "},
+        {kUtf8, Padded, "ab\xC3\xA9", 4, "ab\xC3\xA9    "}, {kGbk, Padded, "a\xD6\xD0", 2, "a   "},
         {kUtf8, Padded, "a\xFF\x62\0"s, -1, "a\xFF\x62     "},
-        {kGbk, Padded, "a\xD6\xD0\0"s, -1, "a "}, {kGbk, Padded, "a\xD6\xD0", 2, "a   "},
-        {kGbk, Padded, "a\xD6\xD0", 3, "a\xD6\xD0 "},
+        {kGbk, Padded, "a\xD6\xD0\0"s, -1, "a "}, {kGbk, Padded, "a\xD6\xD0", 3, "a\xD6\xD0 "},
         {kGbk, Padded, "\xFF\x61\0"s, -1, "\xFF\x61  "},
         // clang-format on
     };
@@ -132,15 +127,14 @@ TEST(Routines, EqualAndCompareIgnoringCase) {
         EXPECT_EQ(mbEqualNoCase(Exact(a).get(), lenA, Exact(b).get(), lenB, &error), same) << a;
         EXPECT_EQ(error, expectedError) << a;
     }
-    const std::tuple<Encoding, const char*, const char*, int> order[] =
-        {
-            // clang-format off
+    // By code point, not byte: U+4E2D before U+6587 in GBK.
+    const std::tuple<Encoding, const char*, const char*, int> order[] = {
+        // clang-format off
         {kUtf8, "abc", "ABD", -1}, {kUtf8, "ABC", "abc", 0}, {kUtf8, "ab", "abc", -1},
         {kUtf8, "abc", "ab", 1}, {kUtf8, "\xC3\xA9", "z", 1}, {kUtf8, "", nullptr, 0},
-        {kCp1252, "\xE4", "\xC4", 0},
-        {kGbk, "\xD6\xD0", "\xCE\xC4", -1},  // by code point (U+4E2D before U+6587), not byte
-                                                 // clang-format on
-        };
+        {kCp1252, "\xE4", "\xC4", 0}, {kGbk, "\xD6\xD0", "\xCE\xC4", -1},
+        // clang-format on
+    };
     for (const auto& [enc, a, b, expected] : order) {
         EncodingScope scope(enc);
         EXPECT_EQ(mbCompareNoCase(a, b), expected) << a;
