@@ -1,10 +1,11 @@
+// The text form of attributes as the records hold it: read, written, malformed
+// and mangled, and multibyte names.
 #include "Attributes.h"
 
 #include <gtest/gtest.h>
 
 #include <random>
 
-#include "dserror.h"
 #include "qoramb.h"
 
 namespace {
@@ -41,17 +42,15 @@ TEST(AttributesTest, TextFormBytesAndRoundTrip) {
 }
 
 TEST(AttributesTest, MalformedTextFailsAndLeavesTargetUnchanged) {
+    // The text, and where the parse stopped.
     const std::pair<const char*, size_t> cases[] = {
-        {"a('1\n)", 2},       // no closing quote before the newline
-        {"a('1'", 2},         // no newline
-        {"a('1'\n", 2},       // newline is the last byte
-        {"a(", 0},            // "(" is the last byte
-        {"('1'\n)", 0},       // empty name
-        {"abc", 0},           // no "("
-        {"a(x'\n)", 2},       // value without opening quote
-        {"a('\n)", 2},        // newline right after the quote
-        {"a('1'\n'2'\n", 6},  // no ")"
-        {"a('1'\n)b", 7},     // trailing name without "("
+        // clang-format off
+        {"a('1\n)", 2}, {"a('1'", 2},          // no closing quote before the newline; no newline
+        {"a('1'\n", 2}, {"a(", 0},             // the newline or "(" is the last byte
+        {"('1'\n)", 0}, {"abc", 0},            // an empty name; no "("
+        {"a(x'\n)", 2}, {"a('\n)", 2},         // no opening quote; a newline right after it
+        {"a('1'\n'2'\n", 6}, {"a('1'\n)b", 7},  // no ")"; a trailing name without "("
+        // clang-format on
     };
     for (const auto& [text, where] : cases) {
         SCOPED_TRACE(text);

@@ -4,6 +4,7 @@
 
 #include <random>
 #include <string>
+#include <tuple>
 #include <vector>
 
 #include "SystemFileDechunker.h"
@@ -41,25 +42,23 @@ TEST(DechunkerTest, ValidationRefusesEntriesThatLeaveTheCases) {
         return false;
     };
     const Entry good = SystemFileDechunker::StringEntry(1, 300, 1, 1);
-    EXPECT_FALSE(refused(good, 40, 40));
-    EXPECT_TRUE(refused(good, 39, 40));  // ordinary units beyond the file case
-    EXPECT_TRUE(refused(good, 40, 39));  // beyond the dictionary's case
-    Entry e = good;
-    e.sourceUnitAfter -= 1;  // segments shorter than the width needs
-    EXPECT_TRUE(refused(e, 40, 40));
-    e = good;
-    e.targetUnitAfter += 1;
-    EXPECT_TRUE(refused(e, 40, 40));
-    e = good;
-    e.width = 0xFFFFFFFFu;
-    EXPECT_TRUE(refused(e, 40, 40));
-    e = SystemFileDechunker::StringEntry(0xFFFFFFF0u, 300, 0, 0);  // wraps around
-    EXPECT_TRUE(refused(e, 40, 40));
-    e = SystemFileDechunker::LeadingEntry(0xFFFFFFFFu);
-    EXPECT_TRUE(refused(e, 40, 40));
-    e = SystemFileDechunker::LeadingEntry(1);
-    e.sourceUnit = 3;  // no string, yet units skipped
-    EXPECT_TRUE(refused(e, 40, 40));
+    Entry shortSegments = good, longTarget = good, wide = good;
+    Entry skipping = SystemFileDechunker::LeadingEntry(1);
+    shortSegments.sourceUnitAfter -= 1;  // segments shorter than the width needs
+    longTarget.targetUnitAfter += 1;
+    wide.width = 0xFFFFFFFFu;
+    skipping.sourceUnit = 3;  // no string, yet units skipped
+    // The entry, the units of the file's case and of the dictionary's, refused or not.
+    const Entry wraps = SystemFileDechunker::StringEntry(0xFFFFFFF0u, 300, 0, 0);
+    const Entry leadsFar = SystemFileDechunker::LeadingEntry(0xFFFFFFFFu);
+    // clang-format off
+    const std::tuple<Entry, uint32_t, uint32_t, bool> rows[] = {{good, 40, 40, false},
+        {good, 39, 40, true}, {good, 40, 39, true}, {shortSegments, 40, 40, true},
+        {longTarget, 40, 40, true}, {wide, 40, 40, true}, {wraps, 40, 40, true},
+        {leadsFar, 40, 40, true}, {skipping, 40, 40, true}};
+    // clang-format on
+    for (const auto& [entry, rawUnits, caseUnits, expected] : rows)
+        EXPECT_EQ(refused(entry, rawUnits, caseUnits), expected) << entry.sourceUnit;
 }
 
 // Plans from a file may say anything: whatever passes validation rebuilds

@@ -1,5 +1,5 @@
 // The buffered file stream under every read and write: mixed sizes, the end
-// of a short file, and append.
+// of a short file, and append; and the collector of the writer's pieces.
 #include "filestream.h"
 
 #include <gtest/gtest.h>
@@ -9,7 +9,9 @@
 #include <string>
 #include <vector>
 
+#include "inmemfile.h"
 #include "sysfile_builder.h"
+#include "writebehind.h"
 
 namespace {
 
@@ -79,4 +81,24 @@ TEST(FileStream, AppendModeStartsAtEnd) {
     std::vector<char> expect = Pattern(700);
     expect.insert(expect.end(), {'e', 'n', 'd'});
     EXPECT_EQ(expect, Get(path));
+}
+
+// Pieces that follow each other, one that goes back over written bytes, and
+// one larger than the collection all land where they belong, and only what
+// the stream was given is there before the flush.
+TEST(WriteBehind, EveryPieceLandsAtItsPlace) {
+    QORA_InMemoryFile file;
+    file.Write("header", 6);
+    WriteBehind out(file);
+    ASSERT_TRUE(out.Append("abc", 3));
+    ASSERT_TRUE(out.Append("def", 3));
+    EXPECT_EQ("header", std::string(file.Data(), file.Size()));
+    ASSERT_TRUE(out.Put(7, "XY", 2));  // back over collected bytes
+    EXPECT_EQ("headerabcdef", std::string(file.Data(), file.Size()));
+    const std::string large(WriteBehind::kSize + 10, 'L');
+    ASSERT_TRUE(out.Put(12, large.data(), uint32_t(large.size())));
+    EXPECT_EQ("headeraXYdef" + large, std::string(file.Data(), file.Size()));
+    ASSERT_TRUE(out.Append("!", 1));
+    ASSERT_TRUE(out.Flush());
+    EXPECT_EQ("headeraXYdef" + large + "!", std::string(file.Data(), file.Size()));
 }

@@ -93,8 +93,7 @@ TEST(Reader, CreationStampOfTheHeaderFields) {
 TEST_P(Reader, WeightNamesTheFirstUnitOfAVariableOrNothing) {
     SysFileBuilder b(GetParam());
     b.String("S", 20);
-    const Var& w = b.Numeric("W");
-    b.Weight(w);
+    b.Weight(b.Numeric("W"));
     EXPECT_EQ(OpenFixture(b.WriteTemp())->GetCaseWeight(), 1);
     for (int32_t index : {2, 0, -5, 5, 99}) {  // continuation, none, out of range
         b.header().weightIndex = index;
@@ -114,13 +113,9 @@ TEST_P(Reader, ContinuationRecordsAreNotCounted) {
 
 TEST_P(Reader, RepeatedAndInvalidNamesAreRenamed) {
     SysFileBuilder b(GetParam());
-    b.Numeric("AGE");
-    b.Numeric("AGE");
-    b.Numeric("V1");
-    b.Numeric("#X");
-    b.Numeric("Age");  // only case differs: no lookup could tell it from AGE
-    b.Numeric("A-B");
-    b.Numeric("\xC3\xA9T\xC3\xA9");
+    // Age differs from AGE only in case: no lookup could tell them apart.
+    for (const char* name : {"AGE", "AGE", "V1", "#X", "Age", "A-B", "\xC3\xA9T\xC3\xA9"})
+        b.Numeric(name);
     auto source = OpenFixture(b.WriteTemp());
     std::vector<std::string> names;
     for (int i = 0; i < source->ColumnCount(); ++i)

@@ -10,14 +10,11 @@
 
 #include "SystemFileDataSource.h"
 #include "case_files.h"
-#include "dserror.h"
 #include "reader_support.h"
 
 namespace {
 
 using namespace fixture;
-
-using IteratorPtr = std::unique_ptr<QORA_InputCaseIterator>;
 
 double Number(const QORA_InputCaseIterator& it, int index) {
     double value;
@@ -31,11 +28,12 @@ std::string Text(const QORA_InputCaseIterator& it, int index, size_t width) {
 
 class SystemFileIteratorTest : public ::testing::TestWithParam<DataForm> {
   protected:
-    SystemFileIteratorTest() : b(std::get<0>(GetParam())) { b.Compressed(std::get<1>(GetParam())); }
-
-    void Open(int cases, std::optional<int32_t> headerCount = std::nullopt) {
+    // The standard cases in this form, under the header's count given.
+    void Open(int cases, int32_t headerCount) {
+        b = SysFileBuilder(std::get<0>(GetParam()));
+        b.Compressed(std::get<1>(GetParam()));
         StandardCases(b, cases);
-        if (headerCount) b.header().caseCount = *headerCount;
+        b.header().caseCount = headerCount;
         it.reset();  // an iterator goes before its source
         source = OpenFixture(b.WriteTemp());
         it.reset(source->NewIterator(nullptr));
@@ -50,7 +48,7 @@ class SystemFileIteratorTest : public ::testing::TestWithParam<DataForm> {
 
     SysFileBuilder b;
     std::unique_ptr<SystemFileDataSource> source;
-    IteratorPtr it;
+    std::unique_ptr<QORA_InputCaseIterator> it;
 };
 
 INSTANTIATE_TEST_SUITE_P(Forms, SystemFileIteratorTest, AllDataForms(), DataFormName);
@@ -65,8 +63,6 @@ TEST_P(SystemFileIteratorTest, RandomWalkOfReadsAndSeeksFollowsTheModel) {
     std::mt19937 random(7);
     for (int32_t claimed : {n, -1, n + 3, 3}) {
         SCOPED_TRACE(claimed);
-        b = SysFileBuilder(std::get<0>(GetParam()));
-        b.Compressed(std::get<1>(GetParam()));
         Open(n, claimed);
         EXPECT_TRUE(it->CanSeek());
         EXPECT_EQ(source->CaseCount(), claimed);

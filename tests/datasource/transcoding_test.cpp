@@ -1,16 +1,14 @@
-// The views the opening factory puts over a file in another encoding than the
+// The view the opening factory puts over a file in another encoding than the
 // interface's: widths, shared maps, numbers bit for bit, cuts at whole
-// characters, repaired names and the warnings.
+// characters, repaired names and the warning.
 #include <gtest/gtest.h>
 
 #include <cstring>
 #include <memory>
 #include <string>
-#include <utility>
 #include <vector>
 
 #include "SystemFileDataSource.h"
-#include "dserror.h"
 #include "encoding_scope.h"
 #include "sysfile_builder.h"
 

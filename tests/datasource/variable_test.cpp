@@ -1,14 +1,17 @@
 // Formats as a file or a caller gives them, judged against the variable's
-// type and repaired only when asked; numeric missing values bit for bit.
+// type and repaired only when asked; numeric missing values bit for bit; value
+// labels whose string keys read as NaN.
 #include "variable.h"
 
 #include <gtest/gtest.h>
 
+#include <cmath>
 #include <cstring>
 #include <limits>
 #include <tuple>
 
 #include "specialvalues.h"
+#include "valuelabelmap.h"
 
 namespace {
 
@@ -76,4 +79,22 @@ TEST(VariableTest, NumericMissingValues) {
         // clang-format on
     };
     for (const auto& [var, x, missing] : rows) EXPECT_EQ(var->IsMissing(&x), missing) << x;
+}
+
+TEST(VLMapTest, KeysThatReadAsNaNStayFindable) {
+    // String chunks whose top bytes are FF read as NaNs; every key must still
+    // be found and none stored twice.
+    QORA_VLMap map(8);
+    const char* texts[] = {"\xff\xff\xff\xff\xff\xff\xff\xff", "a\xff\xff\xff\xff\xff\xff\xff",
+                           "abc\0\0\0\0\0", "\x01\x02\x03\x04\x05\x06\xf8\xff", "zzz\0\0\0\0\0"};
+    for (int round = 0; round < 2; ++round)
+        for (const char* t : texts) map.Insert(std::string(t, 8).data(), t);
+    EXPECT_EQ(map.Count(), 5);
+    for (const char* t : texts) {
+        const std::string* label = map.Lookup(std::string(t, 8).data());
+        ASSERT_NE(label, nullptr);
+        EXPECT_EQ(*label, t);
+    }
+    map.Insert(std::nan(""), "nan");
+    EXPECT_EQ(*map.Lookup(std::nan("")), "nan");
 }

@@ -1,3 +1,5 @@
+// Lines of the multiple response and variable sets records: each form written
+// and read back, malformed lines, records merged, and sets losing absent names.
 #include "variableset.h"
 
 #include <gtest/gtest.h>
@@ -83,24 +85,17 @@ TEST(VariableSetLine, EachFormWrittenAndReadBack) {
 
 TEST(VariableSetLine, MalformedLinesYieldNothing) {
     const char* lines[] = {
-        "$a C 1 L x",                           // no "="
-        "plain set without equals",             // no "=" either
-        "$a=X 1 L x",                           // unknown type byte
-        "$a=",                                  // no type byte
-        "$a=E",                                 // extended without its blank
-        "$a=E 1",                               // flag digits never end
-        "$a=D0  0  x",                          // zero value length
-        "$a=D9 1 0  x",                         // value longer than the line
-        "$a=C 99 L x",                          // label longer than the line
-        "$a=C 99999999999999999999999999 L x",  // length beyond any integer
-        "$a=C x L y",                           // length not a number
-        "$a=C  L y",                            // empty length
-        "$a=D-1 1 0  x",                        // signed length
-        "$a=C 1 Lx",                            // no blank after the label
-        "$a=C 1 L",                             // nothing after the label
-        "$a=D1 1",                              // nothing after the value
-        "$a=D1 1x0  v",                         // no blank after the value
-        "$a=C1 L x",                            // no blank after the type
+        // clang-format off
+        "$a C 1 L x", "plain set without equals",  // no "="
+        "$a=X 1 L x", "$a=", "$a=C1 L x",          // an unknown type, none, no blank after it
+        "$a=E", "$a=E 1",                          // no blank after E, flag digits never end
+        "$a=D0  0  x", "$a=D-1 1 0  x",            // a zero or signed value length
+        "$a=D9 1 0  x", "$a=C 99 L x",             // a value or label longer than the line
+        "$a=C 99999999999999999999999999 L x",     // a length beyond any integer
+        "$a=C x L y", "$a=C  L y",                 // a length not a number, or empty
+        "$a=C 1 Lx", "$a=C 1 L",                   // no blank, or nothing, after the label
+        "$a=D1 1", "$a=D1 1x0  v",                 // nothing, or no blank, after the value
+        // clang-format on
     };
     for (const char* line : lines) EXPECT_EQ(Parsed(line), "nothing") << line;
     // The length claims bytes that lie beyond the view's end in memory.
