@@ -6,22 +6,14 @@
 #include <gtest/gtest.h>
 
 #include <cmath>
-#include <cstring>
 #include <limits>
 #include <tuple>
 
 #include "specialvalues.h"
+#include "sysfile_builder.h"
 #include "valuelabelmap.h"
 
-namespace {
-
-double FromBits(uint64_t bits) {
-    double x;
-    std::memcpy(&x, &bits, sizeof x);
-    return x;
-}
-
-}  // namespace
+using fixture::FromBits;
 
 TEST(VariableTest, ValidateFormat) {
     struct Row {
