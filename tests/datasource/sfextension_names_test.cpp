@@ -8,7 +8,6 @@
 #include <utility>
 #include <vector>
 
-#include "SFExtensionExtNames.h"
 #include "SystemFileExtensionRecord.h"
 #include "memory_source.h"
 #include "reader_support.h"
