@@ -24,7 +24,8 @@ TEST(Movers, CutVeryLongStringsIntoSegments) {
     const std::string a(255, 'a');
     // clang-format off
     const Cut cuts[] = {
-        {"width600", 600, std::string(600, 'a'), {a + ' ', a + ' ', std::string(90, 'a') + "      "}},
+        {"width600", 600, std::string(600, 'a'),
+         {a + ' ', a + ' ', std::string(90, 'a') + "      "}},
         {"multipleOf252", 504, std::string(504, 'b'),
          {std::string(255, 'b') + ' ', std::string(249, 'b') + std::string(7, ' ')}},
         {"blankAt254", 300, std::string(254, 'c') + ' ' + e + std::string(43, 'c'),
