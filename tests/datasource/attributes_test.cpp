@@ -1,66 +1,17 @@
+// The text form of attributes as the records hold it: read, written, malformed
+// and mangled, and multibyte names.
 #include "Attributes.h"
 
 #include <gtest/gtest.h>
 
 #include <random>
 
-#include "dserror.h"
 #include "qoramb.h"
 
 namespace {
 
 bool Parse(Attributes& target, const std::string& text, size_t* pos = nullptr) {
     return target.FromText(text.data(), text.size(), pos);
-}
-
-TEST(AttributesTest, SetRemoveAndChangeCount) {
-    Attributes a;
-    a.Set("Size", {"1"});
-    a.Set("Colour", {"red"});
-    a.Set("SIZE", {"2", "3"});  // case ignored, latest spelling kept
-    ASSERT_EQ(a.Size(), 2);
-    EXPECT_EQ(a.NameAt(0), "SIZE");
-    EXPECT_EQ(a.ValuesAt(0), (Attributes::Values{"2", "3"}));
-    EXPECT_EQ(a.IndexOf("colour"), 1);
-    EXPECT_TRUE(a.ValuesOf("none").empty());
-    EXPECT_THROW(a.NameAt(2), ErrorText);
-    EXPECT_THROW(a.ValuesAt(-1), ErrorText);
-    EXPECT_THROW(a.RemoveAt(2), ErrorText);
-    EXPECT_FALSE(a.Remove("y"));
-    EXPECT_TRUE(a.Remove("colour"));
-    EXPECT_EQ(a.ChangeCount(), 4u);
-    Attributes copy(a);  // a copy counts as one more change
-    EXPECT_EQ(copy.ChangeCount(), 5u);
-    copy.Assign(Attributes());
-    EXPECT_EQ(copy.ChangeCount(), 6u);
-    EXPECT_TRUE(copy == Attributes());
-    EXPECT_EQ(copy.ToText(), "");
-    copy = a;
-    EXPECT_EQ(copy.ChangeCount(), 7u);
-}
-
-TEST(AttributesTest, EqualityCountsCaseAndMergeReplacesOnlyWhenAsked) {
-    Attributes a, b;
-    a.Set("x", {"1"});
-    b.Set("X", {"1"});
-    EXPECT_FALSE(a == b);
-    b.Set("x", {"1"});
-    EXPECT_TRUE(a == b);
-    a.Set("y", {"1"});
-    b.Set("y", {"1", "2"});
-    EXPECT_TRUE(a != b);
-    b.Set("y", {"1"});
-
-    a.Set("keep", {"old"});
-    b.Set("KEEP", {"new"});
-    b.Set("add", {"1"});
-    EXPECT_TRUE(a.Merge(b, false));
-    EXPECT_EQ(a.ValuesOf("keep"), (Attributes::Values{"old"}));
-    EXPECT_EQ(a.Size(), 4);
-    EXPECT_FALSE(a.Merge(b, false));
-    EXPECT_TRUE(a.Merge(b, true));
-    EXPECT_EQ(a.ValuesOf("keep"), (Attributes::Values{"new"}));
-    EXPECT_FALSE(a.Merge(b, true));
 }
 
 TEST(AttributesTest, TextFormBytesAndRoundTrip) {
@@ -91,17 +42,15 @@ TEST(AttributesTest, TextFormBytesAndRoundTrip) {
 }
 
 TEST(AttributesTest, MalformedTextFailsAndLeavesTargetUnchanged) {
+    // The text, and where the parse stopped.
     const std::pair<const char*, size_t> cases[] = {
-        {"a('1\n)", 2},       // no closing quote before the newline
-        {"a('1'", 2},         // no newline
-        {"a('1'\n", 2},       // newline is the last byte
-        {"a(", 0},            // "(" is the last byte
-        {"('1'\n)", 0},       // empty name
-        {"abc", 0},           // no "("
-        {"a(x'\n)", 2},       // value without opening quote
-        {"a('\n)", 2},        // newline right after the quote
-        {"a('1'\n'2'\n", 6},  // no ")"
-        {"a('1'\n)b", 7},     // trailing name without "("
+        // clang-format off
+        {"a('1\n)", 2}, {"a('1'", 2},          // no closing quote before the newline; no newline
+        {"a('1'\n", 2}, {"a(", 0},             // the newline or "(" is the last byte
+        {"('1'\n)", 0}, {"abc", 0},            // an empty name; no "("
+        {"a(x'\n)", 2}, {"a('\n)", 2},         // no opening quote; a newline right after it
+        {"a('1'\n'2'\n", 6}, {"a('1'\n)b", 7},  // no ")"; a trailing name without "("
+        // clang-format on
     };
     for (const auto& [text, where] : cases) {
         SCOPED_TRACE(text);
@@ -135,47 +84,6 @@ TEST(AttributesTest, MangledTextNeverReadsOutside) {
         a.FromText(bytes.data(), bytes.size(), &pos);
         EXPECT_LE(pos, bytes.size());
     }
-}
-
-TEST(AttributesTest, NameRulesAndClasses) {
-    const std::pair<std::string, int> names[] = {{"age", 0},
-                                                 {"age   ", 0},
-                                                 {"", 3},
-                                                 {std::string(65, 'a'), 3},
-                                                 {std::string(64, 'a'), 0},
-                                                 {"a b", 4},
-                                                 {std::string("a\0b", 3), 4},
-                                                 {"and", 5},
-                                                 {"WITHX", 0},
-                                                 {"_a", 6},
-                                                 {"#a", 1},
-                                                 {"$a.", 2},
-                                                 {"a.", 7},
-                                                 {"a_", 100},
-                                                 {"a.b_c", 0}};
-    for (const auto& [name, result] : names)
-        EXPECT_EQ(Attributes::CheckName(name.data(), name.size()), result) << name;
-
-    const std::tuple<std::string, bool, int> classes[] = {{"age", true, 1},
-                                                          {"$ODBC.Type", true, 2},
-                                                          {"$odbc.type", true, 2},
-                                                          {"$ODBC.Type", false, 3},
-                                                          {"$ExtendedFileLabel", false, 2},
-                                                          {"$Unknown", true, 3},
-                                                          {"#scratch", true, 0},
-                                                          {"age.", false, 0}};
-    for (const auto& [name, var, result] : classes)
-        EXPECT_EQ(Attributes::ClassifyName(name.data(), name.size(), var), result) << name;
-    EXPECT_EQ(Attributes::VariableReservedNames().size(), 14u);
-    EXPECT_EQ(Attributes::FileReservedNames().size(), 9u);
-
-    const std::tuple<int, int, const char*> presented[] = {{1, 1, "Size"},
-                                                           {7, 12, "Size[07]"},
-                                                           {12, 12, "Size[12]"},
-                                                           {5, 100, "Size[005]"},
-                                                           {2, 9, "Size[2]"}};
-    for (const auto& [index, count, result] : presented)
-        EXPECT_EQ(Attributes::PresentedName("Size", index, count), result);
 }
 
 TEST(AttributesTest, MultibyteNamesInUtf8Mode) {

@@ -1,9 +1,6 @@
+// Compressed case data: the codes both encoders write, malformed data, random bytes.
 #include <gtest/gtest.h>
-#include <unistd.h>
 
-#include <cmath>
-#include <cstring>
-#include <fstream>
 #include <functional>
 #include <limits>
 #include <random>
@@ -13,29 +10,16 @@
 
 #include "CompressedSystemFile.h"
 #include "dserror.h"
-#include "filestream.h"
 #include "inmemfile.h"
 #include "sparsefileindex.h"
+#include "sysfile_builder.h"
+
+using fixture::Bytes;
+using fixture::Value;
 
 namespace {
 
-using Bytes = std::vector<unsigned char>;
-using Unit = std::array<unsigned char, 8>;
-
 const int64_t kHeader = 16;  // bytes before the case data in every test file
-
-Unit Num(double d) {
-    Unit u;
-    std::memcpy(u.data(), &d, 8);
-    return u;
-}
-Unit Str(const char* s8) {
-    Unit u;
-    std::memcpy(u.data(), s8, 8);
-    return u;
-}
-Unit Sysmis() { return Num(-std::numeric_limits<double>::max()); }  // FFEF..FF
-void Append(Bytes& out, const Unit& u) { out.insert(out.end(), u.begin(), u.end()); }
 
 // An in-memory file holding a header of kHeader bytes and then the data.
 struct MemFile {
@@ -44,26 +28,50 @@ struct MemFile {
         file.Write(header.data(), kHeader);
         if (!data.empty()) file.Write(data.data(), static_cast<uint32_t>(data.size()));
     }
-    Bytes Data() const { return Bytes(file.Data() + kHeader, file.Data() + file.Size()); }
     QORA_InMemoryFile file;
     SparseFileIndex index;
 };
 
-Bytes Encode(uint32_t units, const std::vector<std::vector<Unit>>& cases) {
+// Cases are the bytes of their units, one after the other.
+Bytes Encode(uint32_t units, const std::vector<Bytes>& cases) {
     MemFile m;
     CompressedSystemFile c(units, &m.index, &m.file, kHeader);
-    for (const auto& one : cases) c.WriteCase(one.data());
+    for (const Bytes& one : cases) c.WriteCase(one.data());
     c.Finish();
-    return m.Data();
+    return Bytes(m.file.Data() + kHeader, m.file.Data() + m.file.Size());
 }
 
-std::vector<std::vector<Unit>> DecodeAll(uint32_t units, const Bytes& data) {
+std::vector<Bytes> DecodeAll(uint32_t units, const Bytes& data) {
     MemFile m(data);
     CompressedSystemFile c(units, &m.index, &m.file, kHeader);
-    std::vector<std::vector<Unit>> cases;
-    std::vector<Unit> one(units);
+    std::vector<Bytes> cases;
+    Bytes one(8 * units);
     while (c.ReadCase(one.data(), nullptr) == units) cases.push_back(one);
     return cases;
+}
+
+// The library's encoder and the fixture builder's write the expected bytes
+// for the cases (numbers and strings of width 8), and they decode back.
+void ExpectBothEncoders(const std::vector<std::vector<Value>>& rows, const Bytes& expected) {
+    fixture::SysFileBuilder b;
+    b.Compressed();
+    for (size_t i = 0; i < rows.front().size(); ++i)
+        rows.front()[i].IsString() ? b.String("V" + std::to_string(i), 8)
+                                   : b.Numeric("V" + std::to_string(i));
+    std::vector<Bytes> cases;
+    for (const auto& row : rows) {
+        b.Case(row);
+        cases.emplace_back();
+        for (const Value& value : row) {
+            const Bytes unit = b.Unit(value);
+            cases.back().insert(cases.back().end(), unit.begin(), unit.end());
+        }
+    }
+    const Bytes file = b.Build();
+    const uint32_t units = uint32_t(rows.front().size());
+    EXPECT_EQ(Bytes(file.begin() + long(b.DataStart()), file.end()), expected) << "builder";
+    EXPECT_EQ(Encode(units, cases), expected) << "library";
+    EXPECT_EQ(DecodeAll(units, expected), cases);
 }
 
 // The number and condition of the format error an action raises.
@@ -77,77 +85,50 @@ std::string Raised(const std::function<void()>& action) {
 }
 const std::string kShort = std::to_string(kErrTooShort) + " ";
 
-TEST(CompressedCodes, EncoderTable) {
-    const std::pair<Unit, int> rows[] = {
-        {Num(0.0), 100}, {Num(-99.0), 1}, {Num(151.0), 251},      {Num(100.0), 200},
-        {Num(1.0), 101}, {Sysmis(), 255}, {Str("        "), 254}, {Str("ABCDEFGH"), 253}};
-    for (const auto& [unit, code] : rows)
-        EXPECT_EQ(code, CompressedSystemFile::Encode(unit.data()));
-    for (double raw :
-         {0.5, -0.0, -100.0, 152.0, 255.0, 1.0000001, -1.5, 1e300, -1e300, -99.5, -100.5, 151.5,
-          std::numeric_limits<double>::infinity(), -std::numeric_limits<double>::infinity(),
-          std::numeric_limits<double>::quiet_NaN()}) {
-        EXPECT_EQ(253, CompressedSystemFile::Encode(Num(raw).data())) << raw;
-    }
-}
+}  // namespace
 
-TEST(CompressedWrite, DocumentedExamplesByteByByte) {
-    Bytes expect = {101, 102, 103, 253, 0, 0, 0, 0};
-    Append(expect, Str("ABCDEFGH"));
-    EXPECT_EQ(expect, Encode(4, {{Num(1), Num(2), Num(3), Str("ABCDEFGH")}}));
+TEST(CompressedCodes, BothEncodersWriteTheCodesOfTheLayout) {
+    const double inf = std::numeric_limits<double>::infinity();
+    // clang-format off
+    const std::pair<Value, int> codes[] = {{0.0, 100}, {-99.0, 1}, {151.0, 251}, {100.0, 200},
+        {1.0, 101}, {fixture::kSysmis, 255}, {"", 254}, {"ABCDEFGH", 253}, {"A", 253}, {0.5, 253},
+        {-0.0, 253}, {-100.0, 253}, {152.0, 253}, {255.0, 253}, {1.0000001, 253}, {-1.5, 253},
+        {1e300, 253}, {-1e300, 253}, {-99.5, 253}, {-100.5, 253}, {151.5, 253}, {inf, 253},
+        {-inf, 253}, {std::numeric_limits<double>::quiet_NaN(), 253}};
+    // clang-format on
+    for (const auto& [value, code] : codes) {
+        SCOPED_TRACE(value.IsString() ? value.Text() : std::to_string(value.Number()));
+        Bytes expected = {uint8_t(code), 0, 0, 0, 0, 0, 0, 0};
+        const Bytes raw = fixture::SysFileBuilder().Unit(value);
+        if (code == 253) expected.insert(expected.end(), raw.begin(), raw.end());
+        ExpectBothEncoders({{value}}, expected);
+    }
+    ExpectBothEncoders({{1.0, 2.0, 3.0, "ABCDEFGH"}},
+                       {101, 102, 103, 253, 0, 0, 0, 0, 'A', 'B', 'C', 'D', 'E', 'F', 'G', 'H'});
     // Nine cells make one full block and one padded one.
-    std::vector<std::vector<Unit>> cases(9, {Num(1.0)});
-    const Bytes data = Encode(1, cases);
-    EXPECT_EQ(Bytes({101, 101, 101, 101, 101, 101, 101, 101, 101, 0, 0, 0, 0, 0, 0, 0}), data);
-    EXPECT_EQ(cases, DecodeAll(1, data));
+    ExpectBothEncoders(std::vector<std::vector<Value>>(9, {1.0}),
+                       {101, 101, 101, 101, 101, 101, 101, 101, 101, 0, 0, 0, 0, 0, 0, 0});
     EXPECT_TRUE(Encode(3, {}).empty());
 }
 
-TEST(CompressedRoundTrip, MixedCasesDecodeToTheSameBytes) {
-    std::mt19937 rng(7);
-    const Unit pool[] = {Num(0),    Num(-99), Num(151),        Num(0.5),        Num(-0.0),
-                         Num(1e10), Sysmis(), Str("        "), Str("abcdefgh"), Num(42)};
-    // The last form spans many writes of collected blocks.
-    for (auto [units, count] : {std::pair{1u, 50}, {3u, 50}, {8u, 50}, {13u, 50}, {13u, 5000}}) {
-        std::vector<std::vector<Unit>> cases(count, std::vector<Unit>(units));
-        for (auto& one : cases) {
-            for (auto& u : one) u = pool[rng() % 10];
-        }
-        EXPECT_EQ(cases, DecodeAll(units, Encode(units, cases))) << units;
-    }
-}
-
-TEST(CompressedRead, PaddedLastBlockEndsCleanlyAndStaysAtEnd) {
-    MemFile m({101, 102, 103, 0, 0, 0, 0, 0});
-    CompressedSystemFile c(1, &m.index, &m.file, kHeader);
-    Unit u;
-    for (double want : {1.0, 2.0, 3.0}) {
-        ASSERT_EQ(1u, c.ReadCase(u.data(), nullptr));
-        EXPECT_EQ(Num(want), u);
-    }
-    EXPECT_EQ(0u, c.ReadCase(u.data(), nullptr));
-    EXPECT_TRUE(c.AtEnd());
-    EXPECT_EQ(3, c.CurrentCase());
-    EXPECT_EQ(0u, c.ReadCase(u.data(), nullptr));
+// 252 at the start, in the middle and at the end of blocks ends them; the
+// codes after it (253 among them) have no raw values.
+TEST(CompressedRead, Code252EndsItsBlock) {
+    Bytes data = {101, 252, 253, 253, 102, 102, 102, 102, 252, 253, 253, 253,
+                  253, 253, 253, 253, 103, 253, 104, 105, 106, 107, 108, 252};
+    const Bytes quarter = fixture::SysFileBuilder().Unit(0.25);
+    data.insert(data.end(), quarter.begin(), quarter.end());
+    std::vector<Bytes> expect;
+    for (double x : {1.0, 3.0, 0.25, 4.0, 5.0, 6.0, 7.0, 8.0})
+        expect.push_back(fixture::SysFileBuilder().Unit(x));
+    EXPECT_EQ(expect, DecodeAll(1, data));
     EXPECT_TRUE(DecodeAll(2, Bytes(64, 0)).empty());
     EXPECT_TRUE(DecodeAll(2, Bytes(64, 252)).empty());
 }
 
-TEST(CompressedRead, Code252SkipsTheRestOfItsBlock) {
-    // 252 at the start, in the middle and at the end of blocks; the codes
-    // after it (253 among them) have no raw values.
-    Bytes data = {101, 252, 253, 253, 102, 102, 102, 102, 252, 253, 253, 253,
-                  253, 253, 253, 253, 103, 253, 104, 105, 106, 107, 108, 252};
-    Append(data, Num(0.25));
-    const std::vector<std::vector<Unit>> expect = {{Num(1)}, {Num(3)}, {Num(0.25)}, {Num(4)},
-                                                   {Num(5)}, {Num(6)}, {Num(7)},    {Num(8)}};
-    EXPECT_EQ(expect, DecodeAll(1, data));
-}
-
 TEST(CompressedRead, MalformedDataRaiseTooShort) {
     Bytes raws = {253, 253, 0, 0, 0, 0, 0, 0};  // two raws announced, 1.5 present
-    Append(raws, Num(0.5));
-    raws.insert(raws.end(), 4, 0);
+    raws.insert(raws.end(), 12, 0);
     const std::tuple<uint32_t, Bytes, const char*> rows[] = {
         // The data stop after 3 of a case's 5 cells.
         {5, {101, 102, 103, 0, 0, 0, 0, 0}, "iCell == 0"},
@@ -158,6 +139,11 @@ TEST(CompressedRead, MalformedDataRaiseTooShort) {
         {1, raws, "nRead == nu*sizeof(OBS)"}};
     for (const auto& [units, data, condition] : rows)
         EXPECT_EQ(kShort + condition, Raised([&] { DecodeAll(units, data); }));
+
+    MemFile m({101, 0, 0, 0, 0, 0, 0, 0});
+    CompressedSystemFile c(1, &m.index, &m.file, kHeader);
+    EXPECT_EQ(kShort + "nRead", Raised([&] { c.Seek(11); }));  // no block there
+    EXPECT_NE("nothing", Raised([&] { c.Seek(64); }));         // beyond the data
 }
 
 TEST(CompressedRead, RandomBytesNeverCrashOrHang) {
@@ -174,148 +160,3 @@ TEST(CompressedRead, RandomBytesNeverCrashOrHang) {
         EXPECT_TRUE(raised == "nothing" || raised.rfind(kShort, 0) == 0) << raised;
     }
 }
-
-TEST(CompressedRead, SwapMaskReversesRawCellsOnly) {
-    Bytes data = {253, 105, 253, 0, 0, 0, 0, 0};
-    Unit big = Num(1234.5);
-    std::reverse(big.begin(), big.end());
-    Append(data, big);
-    Append(data, Str("ABCDEFGH"));
-    MemFile m(data);
-    CompressedSystemFile c(3, &m.index, &m.file, kHeader);
-    const unsigned char mask[3] = {1, 1, 0};
-    std::vector<Unit> out(3);
-    ASSERT_EQ(3u, c.ReadCase(out.data(), mask));
-    EXPECT_EQ(Num(1234.5), out[0]);
-    EXPECT_EQ(Num(5), out[1]);
-    EXPECT_EQ(Str("ABCDEFGH"), out[2]);
-}
-
-// Cases of 3 units whose raw values land all over the blocks.
-std::vector<std::vector<Unit>> Numbered(int count) {
-    std::vector<std::vector<Unit>> cases;
-    for (int i = 0; i < count; ++i) {
-        cases.push_back({Num(i), Num(i + 0.5), Num(i % 3 ? 1 : 0.75)});
-    }
-    return cases;
-}
-
-TEST(CompressedPosition, TellAndSeekReturnToEveryCase) {
-    const auto cases = Numbered(40);
-    MemFile m(Encode(3, cases));
-    CompressedSystemFile c(3, &m.index, &m.file, kHeader);
-    std::vector<int64_t> starts;
-    std::vector<Unit> out(3);
-    for (size_t i = 0; i < cases.size(); ++i) {
-        starts.push_back(c.Tell());
-        ASSERT_EQ(3u, c.ReadCase(out.data(), nullptr));
-    }
-    // 120 cells fill 15 blocks: after the last case no block is loaded and
-    // the position names where a next block would start.
-    EXPECT_EQ(static_cast<int64_t>(m.Data().size()), c.Tell());
-    for (size_t i = cases.size(); i-- > 0;) {
-        c.Seek(starts[i]);
-        EXPECT_EQ(starts[i], c.Tell());
-        ASSERT_EQ(3u, c.ReadCase(out.data(), nullptr));
-        EXPECT_EQ(cases[i], out) << i;
-    }
-    // The end of the data is a position too: reading there finds no case.
-    c.Seek(static_cast<int64_t>(m.Data().size()));
-    EXPECT_EQ(0u, c.ReadCase(out.data(), nullptr));
-}
-
-TEST(CompressedPosition, SeekWhereNoBlockIsRaises) {
-    MemFile m({101, 0, 0, 0, 0, 0, 0, 0});
-    CompressedSystemFile c(1, &m.index, &m.file, kHeader);
-    EXPECT_EQ(kShort + "nRead", Raised([&] { c.Seek(11); }));
-    EXPECT_NE("nothing", Raised([&] { c.Seek(64); }));  // beyond the in-memory data
-}
-
-TEST(CompressedPosition, RequestedCasesInAnyOrder) {
-    const auto cases = Numbered(3000);
-    MemFile m(Encode(3, cases));
-    CompressedSystemFile c(3, &m.index, &m.file, kHeader);
-    std::vector<Unit> out(3);
-    for (int64_t want : {5, 2, 2, 1, 2999, 1500, 0, 1499, 1500, 1501, 7, 2000}) {
-        c.SetRequestedCase(want);
-        ASSERT_EQ(3u, c.ReadCase(out.data(), nullptr)) << want;
-        EXPECT_EQ(cases[want], out) << want;
-        EXPECT_EQ(want + 1, c.CurrentCase());
-    }
-    EXPECT_GT(m.index.Count(), 0u);
-    // Beyond the end: positioning stops at the end of the data.
-    c.SetRequestedCase(100000);
-    EXPECT_EQ(0u, c.ReadCase(out.data(), nullptr));
-    EXPECT_EQ(3000, c.CurrentCase());
-    c.SetRequestedCase(2999);
-    ASSERT_EQ(3u, c.ReadCase(out.data(), nullptr));
-    EXPECT_EQ(cases[2999], out);
-}
-
-TEST(CompressedAppend, KeepsRawValuesAndFillsIntoNewBlocks) {
-    const auto first = Numbered(5);  // 15 cells: the last block is partly used
-    MemFile m(Encode(3, first));
-    {
-        CompressedSystemFile c(3, &m.index, &m.file, kHeader);
-        c.PrepareAppend(5);
-        for (const auto& one : Numbered(9)) c.WriteCase(one.data());
-        c.Finish();
-    }
-    auto expect = first;
-    for (const auto& one : Numbered(9)) expect.push_back(one);
-    EXPECT_EQ(expect, DecodeAll(3, m.Data()));
-    // The same bytes as writing all cases in one go.
-    EXPECT_EQ(Encode(3, expect), m.Data());
-}
-
-class CompressedFileTest : public ::testing::Test {
-  protected:
-    void SetUp() override {
-        fPath = ::testing::TempDir() + "qoracomp_" + std::to_string(::getpid()) + "_" +
-                ::testing::UnitTest::GetInstance()->current_test_info()->name();
-    }
-    void TearDown() override { std::remove(fPath.c_str()); }
-    Bytes Data() const {
-        std::ifstream in(fPath, std::ios::binary);
-        Bytes all((std::istreambuf_iterator<char>(in)), {});
-        return Bytes(all.begin() + kHeader, all.end());
-    }
-    std::string fPath;
-};
-
-TEST_F(CompressedFileTest, WriteThenAppendThroughReopenedFile) {
-    SparseFileIndex index;
-    {
-        QORA_FileStream out(fPath.c_str(), "wb");
-        out.Write(std::string(kHeader, 'h').data(), kHeader);
-        CompressedSystemFile c(1, &index, &out, kHeader);
-        for (double v : {1.0, 2.0, 3.0}) c.WriteCase(Num(v).data());
-    }
-    EXPECT_EQ(Bytes({101, 102, 103, 0, 0, 0, 0, 0}), Data());
-    {
-        SparseFileIndex appendIndex;
-        QORA_FileStream file(fPath.c_str(), "rb");
-        CompressedSystemFile c(1, &appendIndex, &file, kHeader);
-        c.PrepareAppend(3);
-        EXPECT_EQ(3, c.Tell());
-        for (double v : {4.0, 0.5}) c.WriteCase(Num(v).data());
-        c.Finish();
-    }
-    Bytes expect = {101, 102, 103, 104, 253, 0, 0, 0};
-    Append(expect, Num(0.5));
-    EXPECT_EQ(expect, Data());
-}
-
-TEST_F(CompressedFileTest, AppendFailsWhenTheFileCannotBeReopened) {
-    { QORA_FileStream out(fPath.c_str(), "wb"); }
-    SparseFileIndex index;
-    QORA_FileStream file(fPath.c_str(), "rb");
-    CompressedSystemFile c(1, &index, &file, 0);
-    std::remove(fPath.c_str());
-    ::mkdir(fPath.c_str(), 0700);  // the name now belongs to a directory
-    EXPECT_EQ(std::to_string(kErrCannotOpen) + " m_->_file.Open(m_->_file.Name(), \"r+b\")",
-              Raised([&] { c.PrepareAppend(0); }));
-    ::rmdir(fPath.c_str());
-}
-
-}  // namespace

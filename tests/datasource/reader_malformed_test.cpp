@@ -38,13 +38,6 @@ INSTANTIATE_TEST_SUITE_P(Orders, MalformedReader,
 
 }  // namespace
 
-TEST(Reader, MissingFileCannotBeOpened) {
-    const OpenFailure f = FailureOf(std::string("/nonexistent/dir/file.qsf"));
-    EXPECT_EQ(f.number, -1);
-    EXPECT_NE(f.text.find("1201"), std::string::npos) << f.text;
-    EXPECT_NE(f.text.find("/nonexistent/dir/file.qsf"), std::string::npos) << f.text;
-}
-
 TEST_P(MalformedReader, HeaderFaults) {
     SysFileBuilder b(GetParam());
     EXPECT_FAILS(b.WriteTemp(Bytes{}, "empty.qsf"), kErrTooShort, "nRead == 4");

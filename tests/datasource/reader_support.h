@@ -42,7 +42,4 @@ inline OpenFailure FailureOf(const std::string& path) {
 inline OpenFailure FailureOf(const fixture::SysFileBuilder& b) { return FailureOf(b.WriteTemp()); }
 
 // Parameterised over both byte orders.
-class ByteOrders : public ::testing::TestWithParam<fixture::Endian> {
-  protected:
-    bool Swapped() const { return GetParam() == fixture::Endian::Swapped; }
-};
+class ByteOrders : public ::testing::TestWithParam<fixture::Endian> {};

@@ -1,13 +1,14 @@
-// The records with handlers of their own: bytes written against the layout
-// and read back, files of both byte orders read, malformed records refused.
+// The records with handlers of their own, read from files of both byte
+// orders: values out of range, texts that do not parse, malformed records
+// (the date variable information among them).
 #include <gtest/gtest.h>
 
 #include <array>
 #include <string>
 #include <tuple>
 #include <utility>
+#include <vector>
 
-#include "SFExtensionEncoding.h"
 #include "SystemFileExtensionRecord.h"
 #include "reader_support.h"
 
@@ -18,73 +19,11 @@ namespace {
 // A value with the separators of the variable attributes record in it.
 const std::string kUnit = SysFileBuilder::AttributeText({{"Unit", {"km/h:"}}});
 
-SystemFileExtensionRecord Exported(int32_t subtype, SystemFileDataSource& source) {
-    SystemFileExtensionRecord record;
-    ExportExtension(subtype, source, source.Settings(), record);
-    return record;
-}
-
-// The record as a file holds it, framed by the builder; empty when there is none.
-Bytes Framed(int32_t subtype, const SystemFileExtensionRecord& record) {
-    if (record.IsEmpty()) return {};
-    const std::string text = record.Text();
-    return SysFileBuilder()
-        .Extension(subtype, record.UnitSize(), record.NUnits(), Bytes(text.begin(), text.end()))
-        .LastRecord();
-}
-
 class ExtensionRecordFiles : public ByteOrders {};
 INSTANTIATE_TEST_SUITE_P(Orders, ExtensionRecordFiles,
                          ::testing::Values(Endian::Native, Endian::Swapped), EndianName);
 
 }  // namespace
-
-TEST(ExtensionRecords, ExportFollowsTheLayoutAndReadsBack) {
-    SystemFileDataSource written, read;
-    for (int32_t subtype : {kDisplayExtension, kFileAttributesExtension, kEncodingExtension})
-        EXPECT_TRUE(Exported(subtype, written).IsEmpty()) << subtype;  // nothing to write
-    int index;
-    for (SystemFileDataSource* source : {&written, &read}) {
-        source->NewVariable(0, &index).SetName("age");
-        source->NewVariable(20, &index).SetName("Income");
-    }
-    Attributes unit;
-    unit.Set("Unit", {"km/h:"});
-    QORA_Variable &age = written.GetVariable(0), &income = written.GetVariable(1);
-    age.SetMeasureLevel(3);
-    age.SetColumnWidth(12);
-    age.SetAlignment(1);
-    age.SetAttributes(unit);
-    income.SetAttributes(unit);
-    written.FileAttributes() = unit;
-    HeaderSettings& s = written.Settings();
-    s.fReleaseMajor = 21, s.fReleaseMinor = 1, s.fReleaseRevision = 2, s.fCaseCount = 42;
-    s.fSysmis = 0.0;  // never written: the library's constants are
-    s.fEncodingName = "UTF-8";
-    SetCharacterCodeFromEncoding(s);
-
-    SysFileBuilder b;
-    const std::pair<int32_t, Bytes> rows[] = {
-        {kIntegerInfoExtension, b.IntegerInfo({21, 1, 2, 720, 1, 1, 2, 65001}).LastRecord()},
-        {kFloatInfoExtension, b.FloatInfo().LastRecord()},
-        {kDisplayExtension, b.DisplayParams({{3, 12, 1},
-                                             {income.GetMeasureLevel(), income.GetColumnWidth(),
-                                              income.GetAlignment()}})
-                                .LastRecord()},
-        {kCaseCountExtension, b.CaseCount64(42).LastRecord()},
-        {kFileAttributesExtension, b.FileAttributes(kUnit).LastRecord()},
-        {kVariableAttributesExtension,
-         b.VariableAttributes({{"age", kUnit}, {"Income", kUnit}}).LastRecord()},
-        {kEncodingExtension, b.Encoding("UTF-8").LastRecord()},
-    };
-    // What was read writes the same record again.
-    for (const auto& [subtype, expected] : rows) {
-        const SystemFileExtensionRecord record = Exported(subtype, written);
-        EXPECT_EQ(Framed(subtype, record), expected) << subtype;
-        ImportExtension(subtype, read, read.Settings(), record);
-        EXPECT_EQ(Framed(subtype, Exported(subtype, read)), expected) << subtype;
-    }
-}
 
 TEST_P(ExtensionRecordFiles, SettingsDisplayAndAttributesAreRead) {
     SysFileBuilder b(GetParam());
@@ -135,7 +74,17 @@ TEST_P(ExtensionRecordFiles, CaseCountFollowsItsMarkerAndOnlyRises) {
     }
 }
 
+// Every file has YEAR_, NAME (two units), MONTH_ and DATE_, for the date
+// variable information.
 TEST_P(ExtensionRecordFiles, MalformedRecordsFailTheOpen) {
+    auto file = [&] {
+        SysFileBuilder b(GetParam());
+        b.Numeric("YEAR_");
+        b.String("NAME", 12);
+        b.Numeric("MONTH_");
+        b.String("DATE_", 10);
+        return b;
+    };
     const std::tuple<int32_t, int32_t, int32_t, std::string> rows[] = {
         {kIntegerInfoExtension, 4, 7, "rec.NUnits() == 8"},
         {kIntegerInfoExtension, 8, 8, "rec.UnitSize() == 4"},
@@ -147,12 +96,26 @@ TEST_P(ExtensionRecordFiles, MalformedRecordsFailTheOpen) {
         {kCaseCountExtension, 8, 3, "rec.NUnits() == 1 || rec.NUnits() == 2"},
         {kFileAttributesExtension, 2, 4, "rec.UnitSize() == sizeof(char)"},
         {kEncodingExtension, 2, 3, "rec.UnitSize() == sizeof(char)"},
+        {kDateInfoExtension, 8, 6, "rec.UnitSize() == 4"},
     };
     for (const auto& [subtype, unitSize, nUnits, condition] : rows) {
-        SysFileBuilder b(GetParam());
-        b.Numeric("A");
-        b.Numeric("B");
+        SysFileBuilder b = file();
         b.Extension(subtype, unitSize, Bytes(size_t(unitSize * nUnits), 1));
+        const OpenFailure f = FailureOf(b);
+        EXPECT_EQ(std::tie(f.number, f.condition), std::make_tuple(kErrBadFormat, condition));
+    }
+    const std::pair<std::vector<int32_t>, std::string> dates[] = {
+        {{0, 1, 11, 1, 1, 1}, "0 <= nDateVars && nDateVars < QORA_TrendsInfo::eMaxDateVars"},
+        {{0, 1, 4, 1, 1, 1, 1, 2, 1, 4, 4, 1, 0, 0, 0}, "nElements >= 3*nDateVars+6"},
+        {{0, 1, 0, 1, 1, 0, 0, 0, 0, 0, 0, 0}, "nElements <= 3*nDateVars+9"},
+        {{0, 1}, "nElements >= kFixedUnits"},
+        {{0, 1, 1, 1, 1, 1, 6, 2, 1, 0, 0, 0}, "iVar < nVars"},
+        {{0, 1, 1, 1, 1, 1, 1, 2, 1, 4, 4, 1},
+         "iDateVar < nDateVars || iType == e_DATKEY || iType == e_NONE"},
+    };
+    for (const auto& [units, condition] : dates) {
+        SysFileBuilder b = file();
+        b.DateInfo(units);
         const OpenFailure f = FailureOf(b);
         EXPECT_EQ(std::tie(f.number, f.condition), std::make_tuple(kErrBadFormat, condition));
     }

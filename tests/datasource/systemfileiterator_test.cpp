@@ -1,3 +1,5 @@
+// Reading cases of files in both byte orders, raw and compressed: a random walk
+// of reads and seeks against a model.
 #include <gtest/gtest.h>
 
 #include <algorithm>
@@ -8,14 +10,11 @@
 
 #include "SystemFileDataSource.h"
 #include "case_files.h"
-#include "dserror.h"
 #include "reader_support.h"
 
 namespace {
 
 using namespace fixture;
-
-using IteratorPtr = std::unique_ptr<QORA_InputCaseIterator>;
 
 double Number(const QORA_InputCaseIterator& it, int index) {
     double value;
@@ -27,23 +26,14 @@ std::string Text(const QORA_InputCaseIterator& it, int index, size_t width) {
     return std::string(static_cast<const char*>(it.ValuePointer(index)), width);
 }
 
-// The condition of the SystemFileException a read raises; empty when none.
-std::string ReadFailure(QORA_InputCaseIterator& it) {
-    try {
-        it.ReadCase();
-    } catch (const SystemFileException& e) {
-        return std::to_string(e.Number()) + " " + e.Condition();
-    }
-    return "";
-}
-
 class SystemFileIteratorTest : public ::testing::TestWithParam<DataForm> {
   protected:
-    SystemFileIteratorTest() : b(std::get<0>(GetParam())) { b.Compressed(std::get<1>(GetParam())); }
-
-    void Open(int cases, std::optional<int32_t> headerCount = std::nullopt) {
+    // The standard cases in this form, under the header's count given.
+    void Open(int cases, int32_t headerCount) {
+        b = SysFileBuilder(std::get<0>(GetParam()));
+        b.Compressed(std::get<1>(GetParam()));
         StandardCases(b, cases);
-        if (headerCount) b.header().caseCount = *headerCount;
+        b.header().caseCount = headerCount;
         it.reset();  // an iterator goes before its source
         source = OpenFixture(b.WriteTemp());
         it.reset(source->NewIterator(nullptr));
@@ -58,160 +48,12 @@ class SystemFileIteratorTest : public ::testing::TestWithParam<DataForm> {
 
     SysFileBuilder b;
     std::unique_ptr<SystemFileDataSource> source;
-    IteratorPtr it;
+    std::unique_ptr<QORA_InputCaseIterator> it;
 };
 
 INSTANTIATE_TEST_SUITE_P(Forms, SystemFileIteratorTest, AllDataForms(), DataFormName);
 
 }  // namespace
-
-TEST_P(SystemFileIteratorTest, IteratorsReadIndependentlyAndAreCounted) {
-    Open(4);
-    EXPECT_EQ(source->LiveIterators(), 1);
-    {
-        IteratorPtr other(source->NewIterator(nullptr));
-        EXPECT_EQ(source->LiveIterators(), 2);
-        ExpectCase(0);
-        ExpectCase(1);
-        ASSERT_TRUE(other->ReadCase());
-        EXPECT_EQ(Number(*other, 0), 0.0);
-        ExpectCase(2);
-    }
-    EXPECT_EQ(source->LiveIterators(), 1);
-    it.reset();
-    EXPECT_EQ(source->LiveIterators(), 0);
-}
-
-TEST_P(SystemFileIteratorTest, FillsTheCallersBuffer) {
-    Open(2);
-    auto buffer = std::make_unique<double[]>(4);
-    IteratorPtr own(source->NewIterator(buffer.get()));
-    ASSERT_TRUE(own->ReadCase());
-    own.reset();
-    EXPECT_EQ(buffer[0], 0.0);
-    EXPECT_EQ(std::memcmp(&buffer[1], "case 0          ", 16), 0);
-    EXPECT_EQ(buffer[3], ExpectedY(0));
-}
-
-TEST_P(SystemFileIteratorTest, APlanThatLeavesTheCaseIsRefusedWhenTheIteratorIsMade) {
-    Open(1);
-    it.reset();
-    auto plan = std::make_unique<SystemFileDechunker>();
-    plan->Add(SystemFileDechunker::StringEntry(1, 300, 1, 1));
-    source->Settings().fpDechunker = std::move(plan);
-    try {
-        it.reset(source->NewIterator(nullptr));
-        FAIL() << "made an iterator over a plan beyond the case";
-    } catch (const SystemFileException& e) {
-        EXPECT_EQ(e.Number(), kErrBadFormat);
-    }
-    EXPECT_EQ(source->LiveIterators(), 0);
-}
-
-TEST_P(SystemFileIteratorTest, DataEndingInsideACaseIsAnErrorEveryTime) {
-    StandardCases(b, 3);
-    Bytes bytes = b.Build();
-    // The last case loses its final unit (a raw value when compressed).
-    const std::string path = b.WriteTemp(Truncated(bytes, bytes.size() - 8), "cut.qsf");
-    source = OpenFixture(path);
-    it.reset(source->NewIterator(nullptr));
-    ExpectCase(0);
-    ExpectCase(1);
-    const std::string expected = std::get<1>(GetParam()) ? "1205 nRead == nu*sizeof(OBS)"
-                                                         : "1205 readLen== 0 || readLen == caseLen";
-    EXPECT_EQ(ReadFailure(*it), expected);
-    EXPECT_EQ(ReadFailure(*it), expected);
-    ASSERT_TRUE(it->SeekCase(1));
-    ExpectCase(1);
-}
-
-// ------------------------------------------------------------- hand-made blocks
-
-namespace {
-
-class CompressedBlocksTest : public ByteOrders {
-  protected:
-    void SetUp() override {
-        b = SysFileBuilder(GetParam());
-        b.Compressed();
-        b.header().caseCount = -1;
-    }
-    void Open() {
-        it.reset();  // an iterator goes before its source
-        source = OpenFixture(b.WriteTemp());
-        it.reset(source->NewIterator(nullptr));
-    }
-    SysFileBuilder b;
-    std::unique_ptr<SystemFileDataSource> source;
-    IteratorPtr it;
-};
-
-INSTANTIATE_TEST_SUITE_P(Orders, CompressedBlocksTest,
-                         ::testing::Values(Endian::Native, Endian::Swapped), EndianName);
-
-}  // namespace
-
-TEST_P(CompressedBlocksTest, ControlBytesCutShortAreAnError) {
-    b.Numeric("X");
-    b.Data(b.Block({101, 102, 0, 0, 0, 0, 0, 0}, {}));
-    b.Data({103, 104, 105});
-    Open();
-    for (double x : {1.0, 2.0}) {
-        ASSERT_TRUE(it->ReadCase());
-        EXPECT_EQ(Number(*it, 0), x);
-    }
-    EXPECT_EQ(ReadFailure(*it), "1205 nRead == 0");
-}
-
-TEST_P(CompressedBlocksTest, DataEndingInsideACaseAreAnError) {
-    b.Numeric("X");
-    b.Numeric("Y");
-    b.String("S", 20);
-    b.Numeric("Z");
-    // One whole case of 6 cells, then 3 cells of the next.
-    b.Data(b.Block({101, 102, 254, 254, 254, 103, 104, 105}, {}));
-    b.Data(b.Block({254, 0, 0, 0, 0, 0, 0, 0}, {}));
-    Open();
-    ASSERT_TRUE(it->ReadCase());
-    EXPECT_EQ(Number(*it, 3), 3.0);
-    EXPECT_EQ(ReadFailure(*it), "1205 iCell == 0");
-    // Positioning over the cut case meets the same end.
-    ASSERT_TRUE(it->SeekCase(5));
-    EXPECT_EQ(ReadFailure(*it), "1205 iCell == 0");
-}
-
-// Raw numbers are reversed for a file of the other order; codes are bytes.
-TEST_P(CompressedBlocksTest, RawCellsFollowTheFileOrderAndStringsNever) {
-    b.Numeric("X");
-    b.String("S", 8);
-    b.Data(b.Block({253, 253, 255, 254, 0, 0, 0, 0}, {Value(1e300), Value("ABCDEFGH")}));
-    Open();
-    ASSERT_TRUE(it->ReadCase());
-    EXPECT_EQ(Number(*it, 0), 1e300);
-    EXPECT_EQ(Text(*it, 1, 8), "ABCDEFGH");
-    ASSERT_TRUE(it->ReadCase());
-    EXPECT_EQ(Number(*it, 0), kSysmis);
-    EXPECT_EQ(Text(*it, 1, 8), "        ");
-    EXPECT_FALSE(it->ReadCase());
-}
-
-// 24-byte cases never line up with the read-ahead or the stream's blocks.
-TEST_P(SystemFileIteratorTest, CasesStraddlingTheReadAheadArriveWhole) {
-    const int n = 15000;
-    b.Numeric("X");
-    b.String("S", 9);
-    for (int i = 0; i < n; ++i) b.Case({i * 0.5, std::to_string(i)});
-    source = OpenFixture(b.WriteTemp());
-    it.reset(source->NewIterator(nullptr));
-    for (int i = 0; i < n; ++i) {
-        ASSERT_TRUE(it->ReadCase());
-        ASSERT_EQ(Number(*it, 0), i * 0.5);
-        const std::string digits = std::to_string(i);
-        ASSERT_EQ(Text(*it, 1, 16), digits + std::string(16 - digits.size(), ' '));
-    }
-    EXPECT_FALSE(it->ReadCase());
-    EXPECT_EQ(source->CaseCount(), n);
-}
 
 // A random walk of reads and seeks against a model of where the iterator
 // stands, over every kind of header count: exact, unknown, too high, too low.
@@ -221,8 +63,6 @@ TEST_P(SystemFileIteratorTest, RandomWalkOfReadsAndSeeksFollowsTheModel) {
     std::mt19937 random(7);
     for (int32_t claimed : {n, -1, n + 3, 3}) {
         SCOPED_TRACE(claimed);
-        b = SysFileBuilder(std::get<0>(GetParam()));
-        b.Compressed(std::get<1>(GetParam()));
         Open(n, claimed);
         EXPECT_TRUE(it->CanSeek());
         EXPECT_EQ(source->CaseCount(), claimed);

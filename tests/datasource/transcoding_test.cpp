@@ -1,16 +1,14 @@
-// The views the opening factory puts over a file in another encoding than the
+// The view the opening factory puts over a file in another encoding than the
 // interface's: widths, shared maps, numbers bit for bit, cuts at whole
-// characters, repaired names and the warnings.
+// characters, repaired names and the warning.
 #include <gtest/gtest.h>
 
 #include <cstring>
 #include <memory>
 #include <string>
-#include <utility>
 #include <vector>
 
 #include "SystemFileDataSource.h"
-#include "dserror.h"
 #include "encoding_scope.h"
 #include "sysfile_builder.h"
 
@@ -68,21 +66,6 @@ TEST(Transcoding, CodePageFileSeenInUtf8) {
     EXPECT_EQ(Value(1, 32), Repeat(zhongUtf8, 4) + "?" + std::string(19, ' '));
     EXPECT_EQ(std::memcmp(it->ValuePointer(4), &odd, 8), 0);
     EXPECT_EQ(Value(5, 16), zhongUtf8 + "?" + std::string(12, ' '));
-}
-
-TEST(Transcoding, WarningsOfACodePageInterface) {
-    EncodingScope scope(kLatin1);
-    for (const auto& [encoding, number] : {std::pair<std::string, long>{"utf8", kWarnNotCodePage},
-                                           {"windows-1252", kWarnCodePageShown}}) {
-        SysFileBuilder b;
-        b.Numeric("A").Label("\xE4\xB8\xAD");  // no Latin-1 character for it
-        b.Encoding(encoding);
-        Warnings warnings;
-        const auto source = OpenForReading(b.WriteTemp().c_str(), &warnings);
-        EXPECT_EQ(warnings.numbers, std::vector<long>{number}) << encoding;
-        EXPECT_STREQ(source->GetVariable(0).GetLabel(),
-                     number == kWarnNotCodePage ? "?" : "\xE4\xB8\xAD");
-    }
 }
 
 }  // namespace

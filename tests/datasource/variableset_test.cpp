@@ -1,3 +1,5 @@
+// Lines of the multiple response and variable sets records: each form written
+// and read back, malformed lines, records merged, and sets losing absent names.
 #include "variableset.h"
 
 #include <gtest/gtest.h>
@@ -14,9 +16,6 @@ using Set = QORA_VariableSet;
 class DictionaryOnly : public QORA_DataSource {
   public:
     QORA_InputCaseIterator* NewIterator(void*) override { return nullptr; }
-    std::string Record(int32_t type) const {
-        return HasExtension(type) ? GetExtension(type).Impl()->Content() : std::string();
-    }
     void SetRecord(int32_t type, const std::string& text) {
         SetExtensionContent(type, 1, static_cast<int32_t>(text.size()), text.data());
     }
@@ -84,51 +83,24 @@ TEST(VariableSetLine, EachFormWrittenAndReadBack) {
     EXPECT_THROW(LineOf(Set(Set::kMultipleCategory)), ErrorText);
 }
 
-TEST(VariableSetLine, ParsesFlagDigitsAndVariableLists) {
-    EXPECT_EQ(Parsed("$m=E 10 1 7 0  a  b A\r\nignored"), "2|$m|7||1|a b ");
-    EXPECT_EQ(Parsed("$c=C 0  x y\n"), "1|$c|||0|x y ");
-    EXPECT_EQ(Parsed("Set one=p q"), "0|Set one|||0|p q ");
-}
-
 TEST(VariableSetLine, MalformedLinesYieldNothing) {
     const char* lines[] = {
-        "$a C 1 L x",                           // no "="
-        "plain set without equals",             // no "=" either
-        "$a=X 1 L x",                           // unknown type byte
-        "$a=",                                  // no type byte
-        "$a=E",                                 // extended without its blank
-        "$a=E 1",                               // flag digits never end
-        "$a=D0  0  x",                          // zero value length
-        "$a=D9 1 0  x",                         // value longer than the line
-        "$a=C 99 L x",                          // label longer than the line
-        "$a=C 99999999999999999999999999 L x",  // length beyond any integer
-        "$a=C x L y",                           // length not a number
-        "$a=C  L y",                            // empty length
-        "$a=D-1 1 0  x",                        // signed length
-        "$a=C 1 Lx",                            // no blank after the label
-        "$a=C 1 L",                             // nothing after the label
-        "$a=D1 1",                              // nothing after the value
-        "$a=D1 1x0  v",                         // no blank after the value
-        "$a=C1 L x",                            // no blank after the type
+        // clang-format off
+        "$a C 1 L x", "plain set without equals",  // no "="
+        "$a=X 1 L x", "$a=", "$a=C1 L x",          // an unknown type, none, no blank after it
+        "$a=E", "$a=E 1",                          // no blank after E, flag digits never end
+        "$a=D0  0  x", "$a=D-1 1 0  x",            // a zero or signed value length
+        "$a=D9 1 0  x", "$a=C 99 L x",             // a value or label longer than the line
+        "$a=C 99999999999999999999999999 L x",     // a length beyond any integer
+        "$a=C x L y", "$a=C  L y",                 // a length not a number, or empty
+        "$a=C 1 Lx", "$a=C 1 L",                   // no blank, or nothing, after the label
+        "$a=D1 1", "$a=D1 1x0  v",                 // nothing, or no blank, after the value
+        // clang-format on
     };
     for (const char* line : lines) EXPECT_EQ(Parsed(line), "nothing") << line;
     // The length claims bytes that lie beyond the view's end in memory.
     const std::string memory = "$a=C 5 L xyz tail";
     EXPECT_EQ(Parsed(std::string_view(memory).substr(0, 10)), "nothing");
-}
-
-TEST(VariableSet, NamesByCaseCodeAndEditsCheckTheirIndex) {
-    Set set = Make(Set::kVariableSet, "MixEd", "", "", {"Age", "AGE", "sex"});  // case ignored
-    EXPECT_EQ(set.GetName(Set::kLowerCase), "mixed");
-    EXPECT_EQ(set.GetName(Set::kUpperCase), "MIXED");
-    EXPECT_EQ(set.GetName(Set::kAsStored), "MixEd");
-    EXPECT_THROW(set.GetName(3), ErrorText);
-    EXPECT_EQ(Describe(set), "0|MixEd|||0|Age sex ");
-    set.SetVariable(1, "gender");
-    set.RemoveVariable(0);
-    EXPECT_EQ(Describe(set), "0|MixEd|||0|gender ");
-    EXPECT_THROW(set.RemoveVariable(1), ErrorText);
-    EXPECT_THROW(set.SetVariable(1, "x"), ErrorText);
 }
 
 TEST(VariableSetLoad, MultipleResponseFamilyReadsBothRecordsAndMerges) {
@@ -153,28 +125,6 @@ TEST(VariableSetLoad, MultipleResponseFamilyReadsBothRecordsAndMerges) {
     ASSERT_EQ(plain.size(), 1u);
     EXPECT_EQ(Describe(plain[0]), "0|vs|||0|a b ");
     EXPECT_TRUE(LoadVariableSets(DictionaryOnly(), QORA_SetFamily::kVariableSets).empty());
-}
-
-TEST(VariableSetStore, RoutesEachSetToItsRecordAndRoundTrips) {
-    DictionaryOnly source;
-    source.SetRecord(kVariableSetExtension, "old= x\n");
-    const QORA_VariableSetList sets = {
-        Make(Set::kMultipleDichotomy, "$d", "1 2", "Label", {"a"}),
-        Make(Set::kMultipleDichotomy, "$e", "9", "", {"b"}, Set::kExtendedFlag),
-        Make(Set::kVariableSet, "plain", "", "", {"c"})};
-    StoreVariableSets(source, sets);
-    EXPECT_EQ(source.Record(kMultRespExtension), "$d=D3 1 2 5 Label a\n");
-    EXPECT_EQ(source.Record(kExtendedMultRespExtension), "$e=E 1 1 9 0  b\n");
-    EXPECT_EQ(source.Record(kVariableSetExtension), "plain= c\n");
-    const QORA_VariableSetList mr = LoadVariableSets(source, QORA_SetFamily::kMultipleResponse);
-    ASSERT_EQ(mr.size(), 2u);
-    EXPECT_EQ(Describe(mr[0]), Describe(sets[0]));
-    EXPECT_EQ(Describe(mr[1]), Describe(sets[1]));
-
-    // A record no set has lines for is left as it was.
-    StoreVariableSets(source, {sets[0]});
-    EXPECT_EQ(source.Record(kExtendedMultRespExtension), "$e=E 1 1 9 0  b\n");
-    EXPECT_EQ(source.Record(kVariableSetExtension), "plain= c\n");
 }
 
 TEST(VariableSetPrune, RemovesUnknownNamesThenEmptySets) {

@@ -4,14 +4,11 @@
 
 #include <gtest/gtest.h>
 
-#include <clocale>
 #include <cstring>
 #include <memory>
 #include <string>
 
-#include "codepage.h"
-#include "encoding_scope.h"
-#include "qoramb.h"
+#include "encoding_scope.h"  // with the code page and multibyte routines
 
 using namespace std::string_literals;
 
@@ -21,5 +18,3 @@ inline std::unique_ptr<char[]> Exact(const std::string& bytes) {
     memcpy(block.get(), bytes.data(), bytes.size());
     return block;
 }
-
-inline std::string Bytes(const char* p, size_t n) { return std::string(p, n); }
