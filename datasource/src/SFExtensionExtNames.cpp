@@ -2,9 +2,11 @@
 // of the written dictionary, in the file's encoding.
 #include "SFExtensionExtNames.h"
 
-#include <map>
+#include <cstdint>
+#include <functional>
 #include <set>
 #include <string>
+#include <string_view>
 #include <utility>
 #include <vector>
 
@@ -21,14 +23,40 @@ namespace {
 enum : size_t { kShortNameBytes = 8 };
 
 using NameList = std::vector<std::pair<std::string, std::string>>;
-// First name to second name; of two entries with one first name, the first wins.
-using Renames = std::map<std::string, std::string>;
 
-Renames SortedCopy(const NameList& list) {
-    Renames renames;
-    for (const auto& [first, second] : list) renames.emplace(first, second);
-    return renames;
-}
+// First name to second name; of two entries with one first name, the first
+// wins. An open-addressed table of list positions, one allocation however
+// long the list: a dictionary's worth of map nodes cost more than renaming.
+class Renames {
+  public:
+    explicit Renames(const NameList& list) : fList(list) {
+        size_t slots = 2;
+        while (slots < 2 * list.size()) slots *= 2;
+        fSlots.assign(slots, 0);
+        for (size_t i = 0; i < list.size(); ++i) {
+            uint32_t& slot = fSlots[SlotOf(list[i].first)];
+            if (slot == 0) slot = uint32_t(i + 1);
+        }
+    }
+
+    // The second name for name; null when no entry has it first.
+    const std::string* Find(std::string_view name) const {
+        const uint32_t slot = fSlots[SlotOf(name)];
+        return slot == 0 ? nullptr : &fList[slot - 1].second;
+    }
+
+  private:
+    // The slot that holds name, or the empty one where it would go.
+    size_t SlotOf(std::string_view name) const {
+        const size_t mask = fSlots.size() - 1;
+        size_t at = std::hash<std::string_view>()(name) & mask;
+        while (fSlots[at] != 0 && fList[fSlots[at] - 1].first != name) at = (at + 1) & mask;
+        return at;
+    }
+
+    const NameList& fList;
+    std::vector<uint32_t> fSlots;  // list position + 1; 0 for none
+};
 
 // 0 -> A, 25 -> Z, 26 -> AA, 27 -> AB, ...
 std::string BijectiveBase26(unsigned k) {
@@ -73,8 +101,7 @@ void RenameSetMembers(QORA_DataSource& source, const Renames& renames, bool expo
                 continue;
             for (size_t k = 0; k < set.GetVariables().size(); ++k) {
                 std::string name = set.GetVariables()[k];
-                const auto found = renames.find(name);
-                if (found != renames.end()) name = found->second;
+                if (const std::string* renamed = renames.Find(name)) name = *renamed;
                 if (exporting) {
                     const std::string cut = mbPrefix(name, kMaxNameBytes);
                     name = MakeLookupKey(cut.data(), cut.size());
@@ -89,13 +116,13 @@ void RenameSetMembers(QORA_DataSource& source, const Renames& renames, bool expo
 void RenameVariables(QORA_DataSource& source, const Renames& renames) {
     for (int i = 0; i < source.ColumnCount(); ++i) {
         QORA_Variable& var = source.GetVariable(i);
-        const auto found = renames.find(var.GetName());
-        if (found != renames.end()) var.SetName(found->second.data(), found->second.size());
+        if (const std::string* renamed = renames.Find(var.GetName()))
+            var.SetName(renamed->data(), renamed->size());
     }
 }
 
 void Rename(QORA_DataSource& source, const NameList& list, bool exporting) {
-    const Renames renames = SortedCopy(list);
+    const Renames renames(list);
     RenameSetMembers(source, renames, exporting);
     RenameVariables(source, renames);
 }
@@ -113,7 +140,7 @@ void ParseNames(const std::string& text, NameList& list) {
         QORA_FILE_CHECK_TEXT(kErrBadFormat, j == len || text[j] == '\t',
                              "j == len || extString[j] == '\\t'");
         list.emplace_back(text.substr(pos, i - pos),
-                          mbPrefix(text.substr(i + 1, j - i - 1), kMaxNameBytes));
+                          mbPrefix(std::string_view(text).substr(i + 1, j - i - 1), kMaxNameBytes));
         pos = j + 1;
     }
 }
