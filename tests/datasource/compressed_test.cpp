@@ -1,6 +1,7 @@
 #include <gtest/gtest.h>
 #include <unistd.h>
 
+#include <algorithm>
 #include <cmath>
 #include <cstring>
 #include <fstream>
@@ -81,13 +82,24 @@ TEST(CompressedCodes, EncoderTable) {
     const std::pair<Unit, int> rows[] = {
         {Num(0.0), 100}, {Num(-99.0), 1}, {Num(151.0), 251},      {Num(100.0), 200},
         {Num(1.0), 101}, {Sysmis(), 255}, {Str("        "), 254}, {Str("ABCDEFGH"), 253}};
-    for (const auto& [unit, code] : rows)
+    std::vector<Unit> all;
+    for (const auto& [unit, code] : rows) {
         EXPECT_EQ(code, CompressedSystemFile::Encode(unit.data()));
+        all.push_back(unit);
+    }
     for (double raw :
          {0.5, -0.0, -100.0, 152.0, 255.0, 1.0000001, -1.5, 1e300, -1e300, -99.5, -100.5, 151.5,
           std::numeric_limits<double>::infinity(), -std::numeric_limits<double>::infinity(),
-          std::numeric_limits<double>::quiet_NaN()}) {
+          std::numeric_limits<double>::quiet_NaN(), -2147483648.0, 4294967297.0, 5e-324}) {
         EXPECT_EQ(253, CompressedSystemFile::Encode(Num(raw).data())) << raw;
+        all.push_back(Num(raw));
+    }
+    // Whole blocks of one case are coded eight units at a time: the same codes.
+    const Bytes data = Encode(uint32_t(all.size()), {all});
+    for (size_t block = 0, at = 0; block * 8 < all.size(); ++block) {
+        for (size_t i = 0; i < 8 && block * 8 + i < all.size(); ++i)
+            EXPECT_EQ(CompressedSystemFile::Encode(all[block * 8 + i].data()), data[at + i]) << i;
+        at += 8 + 8 * size_t(std::count(&data[at], &data[at + 8], 253));
     }
 }
 
