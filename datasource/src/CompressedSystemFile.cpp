@@ -326,13 +326,26 @@ uint32_t CompressedSystemFile::ReadCase(void* units, const unsigned char* swapMa
     return n;
 }
 
-void CompressedSystemFile::WriteBlock() {
+uint32_t CompressedSystemFile::EndBlock() {
     const uint32_t length = kKeySize + kUnitSize * fRawCount;
-    if (!fPending.Put(fDataStart + fBlockStart, fBlock, length))
-        RaiseError(kErrStreamWrite, "compressed case data");
     fNextBlock = fBlockStart + length;
     fAheadStart = fNextBlock;
     fAheadBegin = fAheadEnd = 0;
+    return length;
+}
+
+void CompressedSystemFile::WriteBlock() {
+    fStaged += EndBlock();
+    if (kStageSize - fStaged < kBlockSize) HandOver(0);
+}
+
+void CompressedSystemFile::HandOver(uint32_t extra) {
+    if (fStaged + extra == 0) return;
+    if (!fPending.Put(fDataStart + fStageStart, fStage, fStaged + extra))
+        RaiseError(kErrStreamWrite, "compressed case data");
+    std::memmove(fStage, fStage + fStaged, extra);
+    fStageStart += fStaged;
+    fStaged = 0;
 }
 
 // Every unit is copied to the next raw slot, which only a raw code keeps:
@@ -344,22 +357,24 @@ void CompressedSystemFile::WriteCase(const void* units) {
     const unsigned char* unit = static_cast<const unsigned char*>(units);
     const unsigned char* const end = unit + size_t{kUnitSize} * fUnits;
     uint32_t pos = fPos, raws = fRawCount;
+    unsigned char* block = fStage + fStaged;
     while (unit != end) {
         if (pos >= kKeySize) {
             fBlockStart = fNextBlock;
             pos = raws = 0;
+            block = fStage + fStaged;
         }
         if (pos == 0 && size_t(end - unit) >= kKeySize * kUnitSize) {
-            const uint32_t raw = EncodeEight(unit, fBlock);
+            const uint32_t raw = EncodeEight(unit, block);
             for (uint32_t i = 0; i < kKeySize; ++i, unit += kUnitSize) {
-                std::memcpy(fBlock + kKeySize + kUnitSize * raws, unit, kUnitSize);
+                std::memcpy(block + kKeySize + kUnitSize * raws, unit, kUnitSize);
                 raws += (raw >> i) & 1;
             }
             pos = kKeySize;
         } else {
             const unsigned char code = Encode(unit);
-            fBlock[pos++] = code;
-            std::memcpy(fBlock + kKeySize + kUnitSize * raws, unit, kUnitSize);
+            block[pos++] = code;
+            std::memcpy(block + kKeySize + kUnitSize * raws, unit, kUnitSize);
             raws += code == kRaw;
             unit += kUnitSize;
         }
@@ -378,8 +393,10 @@ void CompressedSystemFile::WriteCase(const void* units) {
 void CompressedSystemFile::Finish() {
     if (!fWritten) return;
     if (fPos < kKeySize) {
-        std::memset(fBlock + fPos, kSkip, kKeySize - fPos);
-        WriteBlock();
+        std::memset(fStage + fStaged + fPos, kSkip, kKeySize - fPos);
+        HandOver(EndBlock());
+    } else {
+        HandOver(0);
     }
     if (!fPending.Flush()) RaiseError(kErrStreamWrite, "compressed case data");
     if (fFile) fFile->Flush();
@@ -402,7 +419,9 @@ void CompressedSystemFile::PrepareAppend(int64_t casesInFile) {
     // its padding and the whole block is written again.
     if (fPos < kKeySize) {
         fRawCount = static_cast<uint32_t>(fRawNext - (fControl + kKeySize)) / kUnitSize;
-        std::memcpy(fBlock, fControl, kKeySize + kUnitSize * fRawCount);
+        std::memcpy(fStage, fControl, kKeySize + kUnitSize * fRawCount);
     }
+    fStaged = 0;
+    fStageStart = position - position % kKeySize;
     DropReadAhead(position - position % kKeySize);
 }
