@@ -253,8 +253,9 @@ void DictionaryReader::AttachValueLabels(
             const int cut = std::min<int>(type, kStringValueSize);
             auto model = byCut.find(cut);
             if (model == byCut.end()) model = byCut.emplace(cut, LabelMap(pairs, type)).first;
+            // A model that already has the type goes to its variables as it is.
             QORA_VLMap map = model->second;
-            map.SetKeyType(type);
+            if (map.KeyType() != type) map.SetKeyType(type);
             found = byType.emplace(type, map).first;
         }
         var.SetValueLabels(found->second);
