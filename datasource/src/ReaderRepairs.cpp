@@ -2,12 +2,12 @@
 
 #include <algorithm>
 #include <string>
-#include <string_view>
 #include <unordered_set>
 #include <vector>
 
 #include "datasrc.h"
 #include "namerules.h"
+#include "nametable.h"
 #include "qoramb.h"
 #include "variableset.h"
 
@@ -65,19 +65,18 @@ void RepairNames(QORA_DataSource& source) {
     // Names are compared by their lookup keys, so that names differing only in
     // case, which no lookup can tell apart, count as repeats too. The keys
     // are those of variables that keep their names.
-    std::unordered_set<std::string_view> keys(size_t(source.ColumnCount()));
+    NameTable keys(size_t(source.ColumnCount()));
     std::vector<int> marked;
     for (int i = 0; i < source.ColumnCount(); ++i) {
         const QORA_Variable& var = source.GetVariable(i);
-        if (!IsAcceptableName(var.GetName()) || !keys.insert(var.GetKey()).second)
-            marked.push_back(i);
+        if (!IsAcceptableName(var.GetName()) || !keys.Insert(var.GetKey(), i)) marked.push_back(i);
     }
     std::unordered_set<std::string> given;
     int counter = 0;
     for (int index : marked) {
         std::string candidate;
         do candidate = "V" + std::to_string(++counter);
-        while (keys.count(candidate) || given.count(candidate));
+        while (keys.Find(candidate) >= 0 || given.count(candidate));
         given.insert(candidate);
         candidate[0] = 'v';
         source.GetVariable(index).SetName(candidate.c_str());

@@ -4,7 +4,6 @@
 
 #include <algorithm>
 #include <cstdint>
-#include <functional>
 #include <set>
 #include <string>
 #include <string_view>
@@ -16,6 +15,7 @@
 #include "datasrc.h"
 #include "dserror.h"
 #include "namerules.h"
+#include "nametable.h"
 #include "qoramb.h"
 #include "variableset.h"
 
@@ -26,37 +26,22 @@ enum : size_t { kShortNameBytes = 8 };
 using NameList = std::vector<std::pair<std::string, std::string>>;
 
 // First name to second name; of two entries with one first name, the first
-// wins. An open-addressed table of list positions, one allocation however
-// long the list: a dictionary's worth of map nodes cost more than renaming.
+// wins.
 class Renames {
   public:
-    explicit Renames(const NameList& list) : fList(list) {
-        size_t slots = 2;
-        while (slots < 2 * list.size()) slots *= 2;
-        fSlots.assign(slots, 0);
-        for (size_t i = 0; i < list.size(); ++i) {
-            uint32_t& slot = fSlots[SlotOf(list[i].first)];
-            if (slot == 0) slot = uint32_t(i + 1);
-        }
+    explicit Renames(const NameList& list) : fList(list), fFirst(list.size()) {
+        for (size_t i = 0; i < list.size(); ++i) fFirst.Insert(list[i].first, int32_t(i));
     }
 
     // The second name for name; null when no entry has it first.
     const std::string* Find(std::string_view name) const {
-        const uint32_t slot = fSlots[SlotOf(name)];
-        return slot == 0 ? nullptr : &fList[slot - 1].second;
+        const int32_t at = fFirst.Find(name);
+        return at < 0 ? nullptr : &fList[size_t(at)].second;
     }
 
   private:
-    // The slot that holds name, or the empty one where it would go.
-    size_t SlotOf(std::string_view name) const {
-        const size_t mask = fSlots.size() - 1;
-        size_t at = std::hash<std::string_view>()(name) & mask;
-        while (fSlots[at] != 0 && fList[fSlots[at] - 1].first != name) at = (at + 1) & mask;
-        return at;
-    }
-
     const NameList& fList;
-    std::vector<uint32_t> fSlots;  // list position + 1; 0 for none
+    NameTable fFirst;
 };
 
 // 0 -> A, 25 -> Z, 26 -> AA, 27 -> AB, ...
