@@ -54,6 +54,7 @@ TEST(Routines, CaseMappingInPlaceKeepsTheByteLength) {
         {kCp1252, true, "\xB5m", "\xB5M"},  // micro's capital is not in cp1252: kept, not "?"
         {kLatin1, true, "\xFF\xE0", "\xFF\xC0"},
         {kGbk, true, "a\xD6\xD0\x62", "A\xD6\xD0\x42"},
+        {kGbk, true, "\x81\x61z", "\x81\x61Z"},  // an ASCII trail byte stays as it is
         // clang-format on
     };
     for (size_t i = 0; i < std::size(rows); ++i) {
