@@ -38,6 +38,7 @@ SystemFileDataSource* FileEntry::SystemFileOrParent() const {
 
 int FileEntry::BuildNameIndex() {
     fNameIndex.clear();
+    fNameIndex.reserve(size_t(fpDataSource->ColumnCount()));
     for (int i = 0; i < fpDataSource->ColumnCount(); ++i) {
         if (!fNameIndex.emplace(fpDataSource->GetVariable(i).GetKey(), i).second)
             return QORA_STATUS_BAD_FILE;

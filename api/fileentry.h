@@ -3,9 +3,9 @@
 
 #include <array>
 #include <cstdint>
-#include <map>
 #include <memory>
 #include <string>
+#include <unordered_map>
 #include <vector>
 
 #include "datasrc.h"
@@ -29,8 +29,8 @@ struct ValueSlot {
     int32_t width;
 };
 
-// Normalised name (compared as unsigned bytes) to dictionary index.
-using NameIndex = std::map<std::string, int32_t>;
+// Normalised name to dictionary index.
+using NameIndex = std::unordered_map<std::string, int32_t>;
 
 struct FileEntry {
     FileEntry(std::unique_ptr<QORA_DataSource> dataSource, OpenMode mode);

@@ -76,6 +76,37 @@ ConverterPtr StoppingClone(UConverter* cnv) {
     return clone;
 }
 
+// Whether every byte below 0x80, read where a character begins, is that
+// ASCII character on its own, and each ASCII character is written as that
+// byte: such bytes need not go through the converter. Stateful and wide
+// encodings are never taken to be so.
+bool ConverterKeepsAscii(UConverter* cnv) {
+    switch (ucnv_getType(cnv)) {
+        case UCNV_SBCS:
+        case UCNV_MBCS:
+        case UCNV_LATIN_1:
+        case UCNV_UTF8:
+        case UCNV_US_ASCII:
+        case UCNV_CESU8:
+            break;
+        default:
+            return false;
+    }
+    bool keeps = true;
+    for (int b = 0; b < 0x80 && keeps; ++b) {
+        const char byte = static_cast<char>(b);
+        const char* p = &byte;
+        UErrorCode err = U_ZERO_ERROR;
+        const UChar32 cp = ucnv_getNextUChar(cnv, &p, &byte + 1, &err);
+        const UChar unit = static_cast<UChar>(b);
+        char out[4];
+        const int32_t length = ucnv_fromUChars(cnv, out, sizeof out, &unit, 1, &err);
+        keeps = U_SUCCESS(err) && cp == b && length == 1 && out[0] == byte;
+    }
+    ucnv_reset(cnv);
+    return keeps;
+}
+
 // A stopping clone of the current converter, kept per thread and lent to one
 // codec at a time: cloning for every call cost more than upper-casing a name.
 // Made again when the current converter has been replaced.
@@ -83,6 +114,7 @@ struct LentConverter {
     ConverterPtr cnv;
     unsigned changes = 0;
     bool lent = false;
+    bool keepsAscii = false;
 };
 thread_local LentConverter tLent;
 
@@ -101,9 +133,16 @@ class CharCodec {
         if (fBorrowed) tLent.lent = false;
     }
 
+    // Whether bytes below 0x80 are ASCII characters of their own both ways.
+    bool KeepsAscii() const { return fKeepsAscii; }
+
     // The contract of Utf8Next, in this codec's encoding.
     int Next(const char* p, size_t n, UChar32* cp) {
         if (fUtf8) return Utf8Next(p, n, cp);
+        if (fKeepsAscii && static_cast<unsigned char>(*p) < 0x80) {
+            *cp = static_cast<unsigned char>(*p);
+            return 1;
+        }
         if (!fCnv) {
             *cp = static_cast<unsigned char>(*p);
             return 1;
@@ -136,16 +175,18 @@ class CharCodec {
     }
 
   private:
-    CharCodec(bool utf8, UConverter* cnv) : fUtf8(utf8) {
+    CharCodec(bool utf8, UConverter* cnv) : fUtf8(utf8), fKeepsAscii(utf8) {
         if (fUtf8) return;
         if (cnv == nullptr && !tLent.lent) {
             UConverter* current = CurrentConverter();
             if (current != nullptr && (!tLent.cnv || tLent.changes != CodePageConverterChanges())) {
                 tLent.cnv = StoppingClone(current);
                 tLent.changes = CodePageConverterChanges();
+                tLent.keepsAscii = tLent.cnv && ConverterKeepsAscii(tLent.cnv.get());
             }
             fCnv = tLent.cnv.get();
             fBorrowed = tLent.lent = fCnv != nullptr;
+            fKeepsAscii = fBorrowed && tLent.keepsAscii;
         } else {
             fOwn = StoppingClone(cnv);
             fCnv = fOwn.get();
@@ -154,6 +195,7 @@ class CharCodec {
     }
 
     bool fUtf8;
+    bool fKeepsAscii;
     bool fBorrowed = false;
     ConverterPtr fOwn;
     UConverter* fCnv = nullptr;
@@ -190,6 +232,12 @@ size_t CodecRun(CharCodec& codec, const char* text, size_t n, bool stopAtMalform
     });
 }
 
+// What ICU's simple case mapping makes of an ASCII character.
+char AsciiCase(char c, bool upper) {
+    if (upper) return c >= 'a' && c <= 'z' ? static_cast<char>(c - 'a' + 'A') : c;
+    return c >= 'A' && c <= 'Z' ? static_cast<char>(c - 'A' + 'a') : c;
+}
+
 // Maps each character of the n bytes at src with ICU's simple case mapping
 // into dst (dst may be src). A mapped character that the encoding cannot
 // hold, or that would take more bytes than the original, is kept as it was,
@@ -199,6 +247,14 @@ size_t CaseMap(const char* src, size_t n, char* dst, size_t dstLen, bool upper, 
     CharCodec codec;
     size_t read = 0, written = 0;
     while (read < n) {
+        if (codec.KeepsAscii() && static_cast<unsigned char>(src[read]) < 0x80) {
+            if (written == dstLen) {
+                *error = 1;
+                break;
+            }
+            dst[written++] = AsciiCase(src[read++], upper);
+            continue;
+        }
         UChar32 cp;
         int length = codec.Next(src + read, n - read, &cp);
         if (length == 0) length = static_cast<int>(n - read), cp = -1;
@@ -397,6 +453,11 @@ int mbCharLength(const char* text, size_t n) {
         int length = codec.Next(text, n, &cp);
         return length == 0 || cp < 0 ? -1 : length;
     }
+    // Letters, digits and the underscore are single bytes in every locale's
+    // initial shift state, as the C standard has it.
+    const char c = *text;
+    if ((c >= 'a' && c <= 'z') || (c >= 'A' && c <= 'Z') || (c >= '0' && c <= '9') || c == '_')
+        return 1;
     mbstate_t state{};
     size_t length = mbrlen(text, n, &state);
     return length == static_cast<size_t>(-1) || length == static_cast<size_t>(-2)
@@ -431,9 +492,10 @@ char* mbTruncate(char* text, int n) {
     return text;
 }
 
-std::string mbPrefix(const std::string& text, size_t maxBytes) {
-    std::string cut = text.substr(0, maxBytes);
-    return std::string(mbTruncate(&cut[0], int(cut.size())));
+std::string mbPrefix(std::string_view text, size_t maxBytes) {
+    std::string cut(text.substr(0, maxBytes));
+    cut.resize(strlen(mbTruncate(&cut[0], int(cut.size()))));
+    return cut;
 }
 
 void mbCopyBounded(char* dst, const char* src, size_t size) {

@@ -14,6 +14,7 @@
 
 #include <cstddef>
 #include <string>
+#include <string_view>
 
 #include "codepage.h"
 
@@ -73,7 +74,7 @@ int mbCompareNoCase(const char* a, const char* b);
 char* mbTruncate(char* text, int n);
 // The longest prefix of text, up to its first NUL, of at most maxBytes bytes
 // that ends on a whole character.
-std::string mbPrefix(const std::string& text, size_t maxBytes);
+std::string mbPrefix(std::string_view text, size_t maxBytes);
 // Copies the longest run of whole characters that fits in size - 1 bytes and
 // zero-fills the rest of the size bytes.
 void mbCopyBounded(char* dst, const char* src, size_t size);

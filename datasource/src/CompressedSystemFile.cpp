@@ -3,6 +3,10 @@
 #include <cstring>
 #include <string>
 
+#if defined(__SSE2__)
+#include <emmintrin.h>
+#endif
+
 #include "byteorder.h"
 #include "dserror.h"
 #include "filestream.h"
@@ -39,6 +43,61 @@ uint64_t BytesEqual(uint64_t codes, unsigned char code) {
 }
 
 uint32_t CountBytes(uint64_t marks) { return uint32_t(((marks >> 7) * kEachByte) >> 56); }
+
+#if defined(__SSE2__)
+// All ones in each 64-bit lane where a and b are equal, zeros elsewhere.
+__m128i Equal64(__m128i a, __m128i b) {
+    const __m128i halves = _mm_cmpeq_epi32(a, b);
+    return _mm_and_si128(halves, _mm_shuffle_epi32(halves, _MM_SHUFFLE(2, 3, 0, 1)));
+}
+
+// The two 64-bit lane masks of m in the two low 32-bit lanes.
+__m128i LowLanes(__m128i m) { return _mm_shuffle_epi32(m, _MM_SHUFFLE(2, 2, 2, 0)); }
+
+__m128i Select(__m128i mask, __m128i yes, __m128i no) {
+    return _mm_or_si128(_mm_and_si128(mask, yes), _mm_andnot_si128(mask, no));
+}
+
+// The codes of two units, in the two low 32-bit lanes. A unit has a number's
+// code when its truncation converts back to the very same bits (so -0.0,
+// fractions, NaN and magnitudes beyond 32 bits are not) and lies in the
+// coded range.
+[[gnu::always_inline]] inline __m128i EncodeTwo(const unsigned char* units) {
+    using C = CompressedSystemFile;
+    const __m128i bits = _mm_loadu_si128(reinterpret_cast<const __m128i*>(units));
+    const __m128i whole = _mm_cvttpd_epi32(_mm_castsi128_pd(bits));
+    const __m128i exact = LowLanes(Equal64(_mm_castpd_si128(_mm_cvtepi32_pd(whole)), bits));
+    const __m128i inRange =
+        _mm_and_si128(_mm_cmpgt_epi32(whole, _mm_set1_epi32(-C::kBias)),
+                      _mm_cmplt_epi32(whole, _mm_set1_epi32(C::kEndOfBlock - C::kBias)));
+    __m128i code = Select(_mm_and_si128(exact, inRange),
+                          _mm_add_epi32(whole, _mm_set1_epi32(C::kBias)), _mm_set1_epi32(C::kRaw));
+    code = Select(LowLanes(Equal64(bits, _mm_set1_epi64x(int64_t(kSysmisBits)))),
+                  _mm_set1_epi32(C::kSysmis), code);
+    return Select(LowLanes(Equal64(bits, _mm_set1_epi64x(int64_t(kBlankBits)))),
+                  _mm_set1_epi32(C::kBlank), code);
+}
+
+// Writes the codes of eight units, judged together so that no branch
+// depends on a value, and returns a mask of the raw ones (bit i for unit i).
+uint32_t EncodeEight(const unsigned char* units, unsigned char* codes) {
+    const __m128i low = _mm_unpacklo_epi64(EncodeTwo(units), EncodeTwo(units + 16));
+    const __m128i high = _mm_unpacklo_epi64(EncodeTwo(units + 32), EncodeTwo(units + 48));
+    const __m128i bytes = _mm_packus_epi16(_mm_packs_epi32(low, high), _mm_setzero_si128());
+    _mm_storel_epi64(reinterpret_cast<__m128i*>(codes), bytes);
+    const __m128i raw = _mm_cmpeq_epi8(bytes, _mm_set1_epi8(char(CompressedSystemFile::kRaw)));
+    return uint32_t(_mm_movemask_epi8(raw)) & 0xFF;
+}
+#else
+uint32_t EncodeEight(const unsigned char* units, unsigned char* codes) {
+    uint32_t raw = 0;
+    for (uint32_t i = 0; i < 8; ++i) {
+        codes[i] = CompressedSystemFile::Encode(units + 8 * i);
+        raw |= uint32_t(codes[i] == CompressedSystemFile::kRaw) << i;
+    }
+    return raw;
+}
+#endif
 
 [[noreturn]] void TooShort(const char* condition, int line) {
     throw SystemFileException(kErrTooShort, condition, __FILE__, line);
@@ -110,7 +169,9 @@ void CompressedSystemFile::DropReadAhead(int64_t position) {
     fAheadBegin = fAheadEnd = 0;
 }
 
-bool CompressedSystemFile::LoadBlock() {
+// Runs once per block of eight cells: inlined, the decoder runs about a
+// quarter faster than with a call per block.
+[[gnu::always_inline]] inline bool CompressedSystemFile::LoadBlock() {
     if (!Fill(kKeySize)) {
         if (fAheadEnd != fAheadBegin) TooShort("nRead == 0", __LINE__);
         fAtEnd = true;
@@ -267,32 +328,58 @@ uint32_t CompressedSystemFile::ReadCase(void* units, const unsigned char* swapMa
     return n;
 }
 
-void CompressedSystemFile::WriteBlock() {
+uint32_t CompressedSystemFile::EndBlock() {
     const uint32_t length = kKeySize + kUnitSize * fRawCount;
-    if (!fPending.Put(fDataStart + fBlockStart, fBlock, length))
-        RaiseError(kErrStreamWrite, "compressed case data");
     fNextBlock = fBlockStart + length;
     fAheadStart = fNextBlock;
     fAheadBegin = fAheadEnd = 0;
+    return length;
+}
+
+void CompressedSystemFile::WriteBlock() {
+    fStaged += EndBlock();
+    if (kStageSize - fStaged < kBlockSize) HandOver(0);
+}
+
+void CompressedSystemFile::HandOver(uint32_t extra) {
+    if (fStaged + extra == 0) return;
+    if (!fPending.Put(fDataStart + fStageStart, fStage, fStaged + extra))
+        RaiseError(kErrStreamWrite, "compressed case data");
+    std::memmove(fStage, fStage + fStaged, extra);
+    fStageStart += fStaged;
+    fStaged = 0;
 }
 
 // Every unit is copied to the next raw slot, which only a raw code keeps:
-// the slot is free again for the next unit otherwise. The block's counters
-// stay in locals between the blocks written.
+// the slot is free again for the next unit otherwise. A block that begins
+// with eight units at hand has their codes made at once. The block's
+// counters stay in locals between the blocks written.
 void CompressedSystemFile::WriteCase(const void* units) {
     fIndex->Offer(fCurrent, Tell());
     const unsigned char* unit = static_cast<const unsigned char*>(units);
     const unsigned char* const end = unit + size_t{kUnitSize} * fUnits;
     uint32_t pos = fPos, raws = fRawCount;
-    for (; unit != end; unit += kUnitSize) {
+    unsigned char* block = fStage + fStaged;
+    while (unit != end) {
         if (pos >= kKeySize) {
             fBlockStart = fNextBlock;
             pos = raws = 0;
+            block = fStage + fStaged;
         }
-        const unsigned char code = Encode(unit);
-        fBlock[pos++] = code;
-        std::memcpy(fBlock + kKeySize + kUnitSize * raws, unit, kUnitSize);
-        raws += code == kRaw;
+        if (pos == 0 && size_t(end - unit) >= kKeySize * kUnitSize) {
+            const uint32_t raw = EncodeEight(unit, block);
+            for (uint32_t i = 0; i < kKeySize; ++i, unit += kUnitSize) {
+                std::memcpy(block + kKeySize + kUnitSize * raws, unit, kUnitSize);
+                raws += (raw >> i) & 1;
+            }
+            pos = kKeySize;
+        } else {
+            const unsigned char code = Encode(unit);
+            block[pos++] = code;
+            std::memcpy(block + kKeySize + kUnitSize * raws, unit, kUnitSize);
+            raws += code == kRaw;
+            unit += kUnitSize;
+        }
         if (pos == kKeySize) {
             fPos = pos;
             fRawCount = raws;
@@ -308,8 +395,10 @@ void CompressedSystemFile::WriteCase(const void* units) {
 void CompressedSystemFile::Finish() {
     if (!fWritten) return;
     if (fPos < kKeySize) {
-        std::memset(fBlock + fPos, kSkip, kKeySize - fPos);
-        WriteBlock();
+        std::memset(fStage + fStaged + fPos, kSkip, kKeySize - fPos);
+        HandOver(EndBlock());
+    } else {
+        HandOver(0);
     }
     if (!fPending.Flush()) RaiseError(kErrStreamWrite, "compressed case data");
     if (fFile) fFile->Flush();
@@ -332,7 +421,9 @@ void CompressedSystemFile::PrepareAppend(int64_t casesInFile) {
     // its padding and the whole block is written again.
     if (fPos < kKeySize) {
         fRawCount = static_cast<uint32_t>(fRawNext - (fControl + kKeySize)) / kUnitSize;
-        std::memcpy(fBlock, fControl, kKeySize + kUnitSize * fRawCount);
+        std::memcpy(fStage, fControl, kKeySize + kUnitSize * fRawCount);
     }
+    fStaged = 0;
+    fStageStart = position - position % kKeySize;
     DropReadAhead(position - position % kKeySize);
 }

@@ -71,7 +71,14 @@ class CompressedSystemFile {
     void DecodeFullBlock(unsigned char* out) const;
     bool Fill(uint32_t need);
     void DropReadAhead(int64_t position);
+    // Ends the block being filled: the next one starts after it. Its length.
+    uint32_t EndBlock();
+    // Ends the block being filled, which then waits with the other complete
+    // ones until the stage is full.
     void WriteBlock();
+    // Hands the complete blocks and extra bytes after them to the collection
+    // of the stream; the extra bytes stay, moved to the front.
+    void HandOver(uint32_t extra);
 
     int64_t fCurrent = 0;
     int64_t fRequested = 0;
@@ -100,8 +107,13 @@ class CompressedSystemFile {
     const unsigned char* fRawNext = nullptr;
     bool fFullBlock = false;  // no code 0 or 252 in the loaded block
 
-    // Writing: control bytes, then room for one raw value per control byte.
-    unsigned char fBlock[kBlockSize] = {};
+    // Writing: complete blocks, fStaged bytes of them, then the block being
+    // filled: control bytes, then room for one raw value per control byte.
+    // Blocks go to the collection below many at a time, not one by one.
+    enum : uint32_t { kStageSize = 64 * kBlockSize };
+    unsigned char fStage[kStageSize] = {};
+    int64_t fStageStart = 0;  // compressed offset of the first byte
+    uint32_t fStaged = 0;
     uint32_t fRawCount = 0;
     // Written blocks not yet handed to the stream; a block written again
     // (the last one, continued after a finish) starts a new collection.

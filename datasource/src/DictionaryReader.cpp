@@ -205,6 +205,7 @@ void DictionaryReader::ReadValueLabels() {
     // Each pair takes at least 16 bytes.
     QORA_FILE_CHECK_TEXT(kErrTooShort, nLabels <= Remaining() / 16, "len == header.size()");
     std::vector<std::pair<std::string, std::string>> pairs;
+    pairs.reserve(size_t(std::max(nLabels, 0)));
     for (int32 i = 0; i < nLabels; ++i) {
         unsigned char head[kStringValueSize + 1];
         ReadExact(head, sizeof head, "len == header.size()");
@@ -224,6 +225,7 @@ void DictionaryReader::ReadValueLabels() {
     std::vector<int32> slots(nVars);
     ReadExact(slots.data(), int64_t(nVars) * 4, "len == nVars*sizeof(int32)");
     std::vector<int> indexes;
+    indexes.reserve(slots.size());
     for (int32 slot : slots) {
         const int index = fSlots.IndexOfSlot(Int(slot));
         QORA_FILE_CHECK_TEXT(kErrBadFormat, index >= 0, "slots.IsValidSlot(slot)");
@@ -253,8 +255,9 @@ void DictionaryReader::AttachValueLabels(
             const int cut = std::min<int>(type, kStringValueSize);
             auto model = byCut.find(cut);
             if (model == byCut.end()) model = byCut.emplace(cut, LabelMap(pairs, type)).first;
+            // A model that already has the type goes to its variables as it is.
             QORA_VLMap map = model->second;
-            map.SetKeyType(type);
+            if (map.KeyType() != type) map.SetKeyType(type);
             found = byType.emplace(type, map).first;
         }
         var.SetValueLabels(found->second);

@@ -1,12 +1,13 @@
 #include "ReaderRepairs.h"
 
 #include <algorithm>
-#include <set>
 #include <string>
+#include <unordered_set>
 #include <vector>
 
 #include "datasrc.h"
 #include "namerules.h"
+#include "nametable.h"
 #include "qoramb.h"
 #include "variableset.h"
 
@@ -62,20 +63,21 @@ void PruneStoredSets(QORA_DataSource& source, bool rewrite) {
 
 void RepairNames(QORA_DataSource& source) {
     // Names are compared by their lookup keys, so that names differing only in
-    // case, which no lookup can tell apart, count as repeats too.
-    std::set<std::string> keys;
+    // case, which no lookup can tell apart, count as repeats too. The keys
+    // are those of variables that keep their names.
+    NameTable keys(size_t(source.ColumnCount()));
     std::vector<int> marked;
     for (int i = 0; i < source.ColumnCount(); ++i) {
         const QORA_Variable& var = source.GetVariable(i);
-        if (!IsAcceptableName(var.GetName()) || !keys.insert(var.GetKey()).second)
-            marked.push_back(i);
+        if (!IsAcceptableName(var.GetName()) || !keys.Insert(var.GetKey(), i)) marked.push_back(i);
     }
+    std::unordered_set<std::string> given;
     int counter = 0;
     for (int index : marked) {
         std::string candidate;
         do candidate = "V" + std::to_string(++counter);
-        while (keys.count(candidate));
-        keys.insert(candidate);
+        while (keys.Find(candidate) >= 0 || given.count(candidate));
+        given.insert(candidate);
         candidate[0] = 'v';
         source.GetVariable(index).SetName(candidate.c_str());
     }

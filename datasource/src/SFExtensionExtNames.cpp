@@ -2,9 +2,11 @@
 // of the written dictionary, in the file's encoding.
 #include "SFExtensionExtNames.h"
 
-#include <map>
+#include <algorithm>
+#include <cstdint>
 #include <set>
 #include <string>
+#include <string_view>
 #include <utility>
 #include <vector>
 
@@ -13,6 +15,7 @@
 #include "datasrc.h"
 #include "dserror.h"
 #include "namerules.h"
+#include "nametable.h"
 #include "qoramb.h"
 #include "variableset.h"
 
@@ -21,14 +24,25 @@ namespace {
 enum : size_t { kShortNameBytes = 8 };
 
 using NameList = std::vector<std::pair<std::string, std::string>>;
-// First name to second name; of two entries with one first name, the first wins.
-using Renames = std::map<std::string, std::string>;
 
-Renames SortedCopy(const NameList& list) {
-    Renames renames;
-    for (const auto& [first, second] : list) renames.emplace(first, second);
-    return renames;
-}
+// First name to second name; of two entries with one first name, the first
+// wins.
+class Renames {
+  public:
+    explicit Renames(const NameList& list) : fList(list), fFirst(list.size()) {
+        for (size_t i = 0; i < list.size(); ++i) fFirst.Insert(list[i].first, int32_t(i));
+    }
+
+    // The second name for name; null when no entry has it first.
+    const std::string* Find(std::string_view name) const {
+        const int32_t at = fFirst.Find(name);
+        return at < 0 ? nullptr : &fList[size_t(at)].second;
+    }
+
+  private:
+    const NameList& fList;
+    NameTable fFirst;
+};
 
 // 0 -> A, 25 -> Z, 26 -> AA, 27 -> AB, ...
 std::string BijectiveBase26(unsigned k) {
@@ -73,8 +87,7 @@ void RenameSetMembers(QORA_DataSource& source, const Renames& renames, bool expo
                 continue;
             for (size_t k = 0; k < set.GetVariables().size(); ++k) {
                 std::string name = set.GetVariables()[k];
-                const auto found = renames.find(name);
-                if (found != renames.end()) name = found->second;
+                if (const std::string* renamed = renames.Find(name)) name = *renamed;
                 if (exporting) {
                     const std::string cut = mbPrefix(name, kMaxNameBytes);
                     name = MakeLookupKey(cut.data(), cut.size());
@@ -89,15 +102,23 @@ void RenameSetMembers(QORA_DataSource& source, const Renames& renames, bool expo
 void RenameVariables(QORA_DataSource& source, const Renames& renames) {
     for (int i = 0; i < source.ColumnCount(); ++i) {
         QORA_Variable& var = source.GetVariable(i);
-        const auto found = renames.find(var.GetName());
-        if (found != renames.end()) var.SetName(found->second.data(), found->second.size());
+        if (const std::string* renamed = renames.Find(var.GetName()))
+            var.SetName(renamed->data(), renamed->size());
     }
 }
 
 void Rename(QORA_DataSource& source, const NameList& list, bool exporting) {
-    const Renames renames = SortedCopy(list);
+    const Renames renames(list);
     RenameSetMembers(source, renames, exporting);
     RenameVariables(source, renames);
+}
+
+// The position of the first "=" or tab from pos on, or npos: one pass,
+// where find_first_of searches its set once per byte.
+size_t FindSeparator(const std::string& text, size_t pos) {
+    const auto at =
+        std::find_if(text.begin() + pos, text.end(), [](char c) { return c == '=' || c == '\t'; });
+    return at == text.end() ? std::string::npos : size_t(at - text.begin());
 }
 
 // Appends one (short name, long name) pair per entry. A long name is cut to
@@ -105,15 +126,15 @@ void Rename(QORA_DataSource& source, const NameList& list, bool exporting) {
 void ParseNames(const std::string& text, NameList& list) {
     const size_t len = text.size();
     for (size_t pos = 0; pos < len;) {
-        const size_t i = text.find_first_of("=\t", pos);
+        const size_t i = FindSeparator(text, pos);
         QORA_FILE_CHECK_TEXT(kErrBadFormat, i != std::string::npos && text[i] == '=',
                              "i != notFound && extString[i] == '='");
-        size_t j = text.find_first_of("=\t", i + 1);
+        size_t j = FindSeparator(text, i + 1);
         if (j == std::string::npos) j = len;
         QORA_FILE_CHECK_TEXT(kErrBadFormat, j == len || text[j] == '\t',
                              "j == len || extString[j] == '\\t'");
         list.emplace_back(text.substr(pos, i - pos),
-                          mbPrefix(text.substr(i + 1, j - i - 1), kMaxNameBytes));
+                          mbPrefix(std::string_view(text).substr(i + 1, j - i - 1), kMaxNameBytes));
         pos = j + 1;
     }
 }

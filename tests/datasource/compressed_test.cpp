@@ -94,7 +94,8 @@ TEST(CompressedCodes, BothEncodersWriteTheCodesOfTheLayout) {
         {1.0, 101}, {fixture::kSysmis, 255}, {"", 254}, {"ABCDEFGH", 253}, {"A", 253}, {0.5, 253},
         {-0.0, 253}, {-100.0, 253}, {152.0, 253}, {255.0, 253}, {1.0000001, 253}, {-1.5, 253},
         {1e300, 253}, {-1e300, 253}, {-99.5, 253}, {-100.5, 253}, {151.5, 253}, {inf, 253},
-        {-inf, 253}, {std::numeric_limits<double>::quiet_NaN(), 253}};
+        {-inf, 253}, {std::numeric_limits<double>::quiet_NaN(), 253}, {-2147483648.0, 253},
+        {4294967297.0, 253}, {5e-324, 253}};
     // clang-format on
     for (const auto& [value, code] : codes) {
         SCOPED_TRACE(value.IsString() ? value.Text() : std::to_string(value.Number()));
@@ -103,6 +104,22 @@ TEST(CompressedCodes, BothEncodersWriteTheCodesOfTheLayout) {
         if (code == 253) expected.insert(expected.end(), raw.begin(), raw.end());
         ExpectBothEncoders({{value}}, expected);
     }
+    // All of them in one case: whole blocks are coded eight units at a time.
+    std::vector<Value> row;
+    Bytes all;
+    for (size_t first = 0; first < std::size(codes); first += 8) {
+        Bytes block(8, 0), raws;
+        for (size_t i = 0; i < 8 && first + i < std::size(codes); ++i) {
+            const auto& [value, code] = codes[first + i];
+            row.push_back(value);
+            block[i] = uint8_t(code);
+            const Bytes raw = fixture::SysFileBuilder().Unit(value);
+            if (code == 253) raws.insert(raws.end(), raw.begin(), raw.end());
+        }
+        all.insert(all.end(), block.begin(), block.end());
+        all.insert(all.end(), raws.begin(), raws.end());
+    }
+    ExpectBothEncoders({row}, all);
     ExpectBothEncoders({{1.0, 2.0, 3.0, "ABCDEFGH"}},
                        {101, 102, 103, 253, 0, 0, 0, 0, 'A', 'B', 'C', 'D', 'E', 'F', 'G', 'H'});
     // Nine cells make one full block and one padded one.

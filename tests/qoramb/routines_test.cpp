@@ -63,6 +63,7 @@ TEST(Routines, EachRespectsWholeCharacters) {
         {kCp1252, Mapped, "\xB5m", 1, "\xB5M"}, {kLatin1, Mapped, "\xFF\xE0", 1, "\xFF\xC0"},
         {kCp1252, Mapped, "\xE9t\xE9 \xFF", 1, "\xC9T\xC9 \x9F"},
         {kGbk, Mapped, "a\xD6\xD0\x62", 1, "A\xD6\xD0\x42"},
+        {kGbk, Mapped, "\x81\x61z", 1, "\x81\x61Z"},  // an ASCII trail byte stays as it is
         {kUtf8, Truncate, "ab\xC3\xA9z", 3, "ab"},
         {kUtf8, Truncate, "ab\xC3\xA9z", 4, "ab\xC3\xA9"},
         {kUtf8, Truncate, "ab\xC3\xA9", 40, "ab\xC3\xA9"},
