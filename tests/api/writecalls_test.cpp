@@ -137,6 +137,9 @@ TEST(WriteAccess, StatusesFollowModeAndCommitment) {
     } rules[] = {
         {"CommitHeader", qoraCommitHeader, 8, 11, 30, 30},
         {"SetVarName", [](int h) { return qoraSetVarName(h, "y", 0); }, 8, 0, 30, 30},
+        {"SetVarLabel", [](int h) { return qoraSetVarLabel(h, "x", "l"); }, 8, 12, 30, 30},
+        {"SetVarNValueLabel", [](int h) { return qoraSetVarNValueLabel(h, "x", 1, "l"); }, 8, 12,
+         30, 30},
         {"SetCompression", [](int h) { return qoraSetCompression(h, 1); }, 8, 0, 30, 30},
         {"SetValueNumeric", [](int h) { return qoraSetValueNumeric(h, 1.0, 2.0); }, 8, 31, 0, 0},
         {"CommitCaseRecord", qoraCommitCaseRecord, 8, 31, 0, 0},
