@@ -8,6 +8,7 @@
 #include <cstring>
 #include <filesystem>
 #include <fstream>
+#include <set>
 #include <stdexcept>
 
 namespace fixture {
@@ -240,16 +241,13 @@ Bytes SysFileBuilder::HeaderBytes() const {
 // A variable is one record per segment (one segment unless it is a very long
 // string), each followed by its continuation records. The label goes to every
 // segment, the missing values and the overrides to the first record.
-void SysFileBuilder::WriteVar(Out& out, const Var& var) const {
+void SysFileBuilder::WriteVar(Out& out, const Var& var,
+                              const std::vector<std::string>& segmentNames) const {
     std::vector<int> segments{var.fWidth};
     if (var.fWidth > kMaxShortString) {
         segments.assign(var.fWidth / kSegmentChars, kMaxShortString);
         if (var.fWidth % kSegmentChars) segments.push_back(var.fWidth % kSegmentChars);
     }
-    // Segments after the first are named, as a writer names them, from the
-    // first five bytes of the upper-case name the variable is known by.
-    std::string stem = (var.fLongName.empty() ? var.fName : var.fLongName).substr(0, 5);
-    for (char& c : stem) c = char(std::toupper(static_cast<unsigned char>(c)));
     for (size_t s = 0; s < segments.size(); ++s) {
         const int width = segments[s];
         const bool first = s == 0;
@@ -262,7 +260,7 @@ void SysFileBuilder::WriteVar(Out& out, const Var& var) const {
         out.I32(first ? var.fMissingCode : 0);
         out.I32(first && var.fPrint ? *var.fPrint : format);
         out.I32(first && var.fWrite ? *var.fWrite : format);
-        out.Text(first ? var.fName : stem + std::to_string(s - 1), 8);
+        out.Text(first ? var.fName : segmentNames[s - 1], 8);
         if (hasLabel) {
             const std::string& label = *var.fLabel;
             out.I32(var.fLabelLengthField.value_or(int32_t(label.size())));
@@ -448,11 +446,40 @@ SysFileBuilder& SysFileBuilder::EndRecord(bool write, int32_t filler) {
     return *this;
 }
 
+// Segments after the first are named, as a writer names them, from the first
+// five bytes of the upper-case name the variable is known by and a base-36
+// counter, skipping every name of the dictionary and every name given
+// before; the last very long string is named first.
+std::vector<std::vector<std::string>> SysFileBuilder::SegmentNames() const {
+    auto upper = [](std::string text) {
+        for (char& c : text) c = char(std::toupper(static_cast<unsigned char>(c)));
+        return text;
+    };
+    std::set<std::string> used;
+    for (const Var& var : fVars) used.insert({upper(var.fName), upper(var.fLongName)});
+    std::vector<std::vector<std::string>> names(fVars.size());
+    for (size_t i = fVars.size(); i-- > 0;) {
+        const Var& var = fVars[i];
+        if (var.fWidth <= kMaxShortString) continue;
+        const std::string base =
+            upper(var.fLongName.empty() ? var.fName : var.fLongName).substr(0, 5);
+        const int later = (var.fWidth + kSegmentChars - 1) / kSegmentChars - 1;
+        for (unsigned counter = 0; int(names[i].size()) < later; ++counter) {
+            std::string digits;
+            for (unsigned n = counter; digits.empty() || n > 0; n /= 36)
+                digits.insert(digits.begin(), "0123456789ABCDEFGHIJKLMNOPQRSTUVWXYZ"[n % 36]);
+            if (used.insert(base + digits).second) names[i].push_back(base + digits);
+        }
+    }
+    return names;
+}
+
 Bytes SysFileBuilder::Dictionary() const {
     Out out(fEndian == Endian::Swapped);
+    const std::vector<std::vector<std::string>> segmentNames = SegmentNames();
     for (const Record& record : fRecords) {
         if (record.var >= 0)
-            WriteVar(out, fVars[record.var]);
+            WriteVar(out, fVars[record.var], segmentNames[size_t(record.var)]);
         else
             out.Append(record.bytes);
     }

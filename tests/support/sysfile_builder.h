@@ -269,7 +269,8 @@ class SysFileBuilder {
 
     Bytes HeaderBytes() const;
     Bytes Dictionary() const;
-    void WriteVar(Out& out, const Var& var) const;
+    std::vector<std::vector<std::string>> SegmentNames() const;
+    void WriteVar(Out& out, const Var& var, const std::vector<std::string>& segmentNames) const;
     void AppendCase(std::vector<CaseUnit>& units, const std::vector<Value>& row) const;
     Bytes CaseData() const;
     Bytes Compress(const std::vector<CaseUnit>& units) const;
