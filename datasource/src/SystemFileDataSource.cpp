@@ -105,7 +105,12 @@ void SystemFileDataSource::WriteCase(const void* units) {
     if (fLiveIterators > 0) RaiseError(kErrWriteWhileReading);
     if (fState == kNothingYet) CommitDictionary();
     NamingFailures(GetFileName(), [&] {
-        if (fState == kReading) StartAppending();
+        QORA_FILE_CHECK_TEXT(kErrCaseWrite, !fAppendFailed, "toWrite");
+        if (fState == kReading) {
+            fAppendFailed = true;
+            StartAppending();
+            fAppendFailed = false;
+        }
         fState = kWriting;
         fpWriter->WriteCase(units);
     });

@@ -98,6 +98,9 @@ class SystemFileDataSource : public IndependentDataStore {
     void StartAppending();
 
     State fState = kNothingYet;
+    // An append that could not start may have left the stream anywhere:
+    // no case is written after it, so none lands on the cases already there.
+    bool fAppendFailed = false;
     HeaderSettings fSettings;
     QORA_FileStream fStream;
     int64_t fDataStart = 0;

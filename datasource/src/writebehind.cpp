@@ -8,7 +8,7 @@ bool WriteBehind::Put(int64_t at, const void* data, uint32_t count) {
     if (fLength > 0 && at != fStart + fLength && !Flush()) return false;
     if (count > kSize - fLength && !WriteWholeStretches()) return false;
     if (count > kSize - fLength && !Flush()) return false;
-    if (count > kSize) return fStream.Seek(at, 0) == 0 && fStream.Write(data, count) == count;
+    if (count > kSize) return WriteAt(at, data, count);
     if (!fBuffer) fBuffer.reset(new unsigned char[kSize]);
     if (fLength == 0) fStart = at;
     std::memcpy(fBuffer.get() + fLength, data, count);
@@ -40,7 +40,13 @@ bool WriteBehind::WriteWholeStretches() {
     return written;
 }
 
-bool WriteBehind::Write(uint32_t length) {
-    if (length == 0) return true;
-    return fStream.Seek(fStart, 0) == 0 && fStream.Write(fBuffer.get(), length) == length;
+bool WriteBehind::Write(uint32_t length) { return WriteAt(fStart, fBuffer.get(), length); }
+
+bool WriteBehind::WriteAt(int64_t at, const void* data, uint32_t count) {
+    if (fFailed) return false;
+    if (count == 0) return true;
+    // A stream that raises leaves the flag set.
+    fFailed = true;
+    fFailed = fStream.Seek(at, 0) != 0 || fStream.Write(data, count) != count;
+    return !fFailed;
 }

@@ -25,14 +25,18 @@ class WriteBehind {
     bool Append(const void* data, uint32_t count);
     // Writes what is collected, which is then given up whatever happens.
     bool Flush();
+    // After one write has failed nothing more is written: bytes that belong
+    // after the ones lost would leave a gap that a reader takes for data.
 
   private:
     bool WriteWholeStretches();
     // Writes the first length bytes collected at their place.
     bool Write(uint32_t length);
+    bool WriteAt(int64_t at, const void* data, uint32_t count);
 
     QORA_StrBaseIO& fStream;
     std::unique_ptr<unsigned char[]> fBuffer;  // made at the first Put
     int64_t fStart = 0;
     uint32_t fLength = 0;
+    bool fFailed = false;
 };
