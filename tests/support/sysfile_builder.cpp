@@ -427,10 +427,6 @@ SysFileBuilder& SysFileBuilder::MultipleResponseSets(std::vector<std::string> li
     return TextExtension(7, Lines(lines));
 }
 
-SysFileBuilder& SysFileBuilder::ExtendedMultipleResponseSets(std::vector<std::string> lines) {
-    return TextExtension(19, Lines(lines));
-}
-
 SysFileBuilder& SysFileBuilder::VariableSets(std::vector<std::string> lines) {
     return TextExtension(5, Lines(lines));
 }
@@ -676,15 +672,6 @@ std::string SysFileBuilder::DichotomySetLine(const std::string& name, const std:
                                              const std::string& label,
                                              const std::vector<std::string>& vars) {
     return name + "=D" + std::to_string(counted.size()) + " " + counted + " " +
-           std::to_string(label.size()) + " " + label + " " + Joined(vars, " ");
-}
-
-std::string SysFileBuilder::ExtendedDichotomySetLine(const std::string& name,
-                                                     const std::string& flags,
-                                                     const std::string& counted,
-                                                     const std::string& label,
-                                                     const std::vector<std::string>& vars) {
-    return name + "=E " + flags + " " + std::to_string(counted.size()) + " " + counted + " " +
            std::to_string(label.size()) + " " + label + " " + Joined(vars, " ");
 }
 

@@ -206,9 +206,8 @@ class SysFileBuilder {
     SysFileBuilder& VariableAttributes(std::vector<std::pair<std::string, std::string>> nameText);
     SysFileBuilder& Encoding(const std::string& name);
     SysFileBuilder& LongValueLabelsRecord(std::vector<LongValueLabels> entries);
-    SysFileBuilder& MultipleResponseSets(std::vector<std::string> lines);          // subtype 7
-    SysFileBuilder& ExtendedMultipleResponseSets(std::vector<std::string> lines);  // 19
-    SysFileBuilder& VariableSets(std::vector<std::string> lines);                  // subtype 5
+    SysFileBuilder& MultipleResponseSets(std::vector<std::string> lines);  // subtype 7
+    SysFileBuilder& VariableSets(std::vector<std::string> lines);          // subtype 5
 
     // Bytes placed as they are among the dictionary records.
     SysFileBuilder& RawRecord(Bytes bytes);
@@ -231,8 +230,6 @@ class SysFileBuilder {
     Bytes Block(std::array<uint8_t, 8> codes, const std::vector<Value>& raws) const;
 
     Bytes Build() const;
-    // The bytes of the dictionary record added last (not a variable).
-    const Bytes& LastRecord() const { return fRecords.back().bytes; }
     size_t DataStart() const;  // offset of the first byte of the case data
     // Writes into a directory of the running test, removed with the builder.
     std::string WriteTemp(const std::string& fileName = "fixture.qsf") const;
@@ -246,10 +243,6 @@ class SysFileBuilder {
     static std::string DichotomySetLine(const std::string& name, const std::string& counted,
                                         const std::string& label,
                                         const std::vector<std::string>& vars);
-    static std::string ExtendedDichotomySetLine(const std::string& name, const std::string& flags,
-                                                const std::string& counted,
-                                                const std::string& label,
-                                                const std::vector<std::string>& vars);
     static std::string VariableSetLine(const std::string& name,
                                        const std::vector<std::string>& vars);
 
