@@ -113,11 +113,4 @@ TEST(QoraDump, Utf8ShowsAFileInACodePageConverted) {
         EXPECT_NE(run.output.find(line), std::string::npos) << line;
 }
 
-TEST(QoraDump, AFileWithoutVariablesIsStillAFile) {
-    fixture::SysFileBuilder b;
-    const DumpResult run = Dump(b.WriteTemp());
-    EXPECT_EQ(run.exitCode, 0) << run.output;
-    EXPECT_NE(run.output.find("Variables: 0\n"), std::string::npos) << run.output;
-}
-
 }  // namespace

@@ -274,19 +274,4 @@ TEST_F(WriteHandle, DisplayPropertiesIgnoreValuesOutOfRange) {
     }
 }
 
-TEST(VariableGetters, ClearOutputsOnABadHandle) {
-    char name[8] = "junk";
-    int type = 5, count = 5;
-    double v = 1.0, handle = 1.0;
-    EXPECT_EQ(qoraGetVarInfo(-1, 0, name, &type), QORA_STATUS_BAD_FILE_HANDLE);
-    EXPECT_EQ(name + std::string("|") + std::to_string(type), "|0");
-    EXPECT_EQ(qoraGetVarHandle(100, "a", &handle), QORA_STATUS_BAD_FILE_HANDLE);
-    EXPECT_EQ(handle, 0.0);
-    EXPECT_EQ(qoraGetVarNMissingValues(99, "a", &count, &v, nullptr, nullptr),
-              QORA_STATUS_BAD_FILE_HANDLE);
-    EXPECT_EQ(count, 0);
-    EXPECT_EQ(v, 0.0);
-    EXPECT_EQ(qoraSetVarName(-7, "a", 0), QORA_STATUS_BAD_FILE_HANDLE);
-}
-
 }  // namespace
