@@ -112,40 +112,38 @@ TEST_P(CaseCallsTest, WholeCaseInCopiesTheCaseAndLeavesNoCurrentCase) {
     EXPECT_EQ(qoraSeekNextCase(handle, 2), QORA_STATUS_OK);
     ASSERT_EQ(qoraWholeCaseIn(handle, record), QORA_STATUS_OK);
     EXPECT_EQ(record[0], 2.0);
-    EXPECT_EQ(qoraWholeCaseIn(handle, nullptr), QORA_STATUS_READ_FAILED);
 }
 
-TEST_P(CaseCallsTest, VariableHandlesAreIndexPlusOneTruncated) {
+// Variable handles are the index plus one, truncated; the type, the buffer
+// and the file handle are checked, and a failed call clears its output.
+TEST_P(CaseCallsTest, ValueCallsCheckTheirArguments) {
     Open(2);
-    ASSERT_EQ(qoraReadCaseRecord(handle), QORA_STATUS_OK);
-    ASSERT_EQ(qoraReadCaseRecord(handle), QORA_STATUS_OK);
-    double value;
-    char text[20];
-    for (double bad : {0.0, 0.99, -1.0, 4.0, 1e300, std::numeric_limits<double>::quiet_NaN()}) {
-        EXPECT_EQ(qoraGetValueNumeric(handle, bad, &value), QORA_STATUS_BAD_VAR_HANDLE) << bad;
-        EXPECT_EQ(qoraGetValueChar(handle, bad, text, 20), QORA_STATUS_BAD_VAR_HANDLE) << bad;
-    }
-    EXPECT_EQ(qoraGetValueNumeric(handle, 3.9, &value), QORA_STATUS_OK);
-    EXPECT_EQ(value, ExpectedY(1));
-    EXPECT_EQ(qoraGetValueChar(handle, 2.9, text, 20), QORA_STATUS_OK);
-    EXPECT_EQ(std::string(text), ExpectedS(1));
-}
-
-TEST_P(CaseCallsTest, ValueCallsCheckTypeAndBuffer) {
-    Open(1);
     ASSERT_EQ(qoraReadCaseRecord(handle), QORA_STATUS_OK);
     double value = 9;
     char text[13] = "xxxxxxxxxxxx";
+    for (double bad : {0.0, 0.99, -1.0, 4.0, 1e300, std::numeric_limits<double>::quiet_NaN()}) {
+        EXPECT_EQ(qoraGetValueNumeric(handle, bad, &value), QORA_STATUS_BAD_VAR_HANDLE) << bad;
+        EXPECT_EQ(qoraGetValueChar(handle, bad, text, 13), QORA_STATUS_BAD_VAR_HANDLE) << bad;
+    }
     EXPECT_EQ(qoraGetValueNumeric(handle, 2.0, &value), QORA_STATUS_NUMERIC_REQUIRED);
     EXPECT_EQ(value, 0.0);
     EXPECT_EQ(qoraGetValueChar(handle, 1.0, text, 13), QORA_STATUS_STRING_REQUIRED);
     EXPECT_EQ(text[0], '\0');
     EXPECT_EQ(qoraGetValueChar(handle, 2.0, text, 12), QORA_STATUS_BUFFER_TOO_SHORT);
     EXPECT_EQ(qoraGetValueChar(handle, 2.0, text, 0), QORA_STATUS_BUFFER_TOO_SHORT);
-    EXPECT_EQ(qoraGetValueChar(handle, 2.0, text, 13), QORA_STATUS_OK);
-    EXPECT_EQ(std::string(text, 13), ExpectedS(0) + '\0');
     EXPECT_EQ(qoraGetValueNumeric(handle, 1.0, nullptr), QORA_STATUS_READ_FAILED);
     EXPECT_EQ(qoraGetValueChar(handle, 2.0, nullptr, 13), QORA_STATUS_READ_FAILED);
+    EXPECT_EQ(qoraWholeCaseIn(handle, nullptr), QORA_STATUS_READ_FAILED);
+    ASSERT_EQ(qoraReadCaseRecord(handle), QORA_STATUS_OK);
+    EXPECT_EQ(qoraGetValueNumeric(handle, 3.9, &value), QORA_STATUS_OK);
+    EXPECT_EQ(value, ExpectedY(1));
+    EXPECT_EQ(qoraGetValueChar(handle, 2.9, text, 13), QORA_STATUS_OK);
+    EXPECT_EQ(std::string(text, 13), ExpectedS(1) + '\0');
+    EXPECT_EQ(qoraReadCaseRecord(-1), QORA_STATUS_BAD_FILE_HANDLE);
+    EXPECT_EQ(qoraWholeCaseIn(100, &value), QORA_STATUS_BAD_FILE_HANDLE);
+    EXPECT_EQ(qoraSeekNextCase(99, 0), QORA_STATUS_BAD_FILE_HANDLE);
+    EXPECT_EQ(qoraGetValueNumeric(handle + 1, 1.0, &value), QORA_STATUS_BAD_FILE_HANDLE);
+    EXPECT_EQ(qoraGetValueChar(handle + 1, 1.0, text, 4), QORA_STATUS_BAD_FILE_HANDLE);
 }
 
 // A case cut short is an error each time it is asked for, and leaves no
@@ -164,17 +162,6 @@ TEST_P(CaseCallsTest, DataEndingInsideACaseFailsTheRead) {
     EXPECT_EQ(qoraSeekNextCase(handle, 1), QORA_STATUS_OK);
     ASSERT_EQ(qoraReadCaseRecord(handle), QORA_STATUS_OK);
     ExpectValues(1);
-}
-
-TEST(CaseCalls, BadHandlesGiveTheirStatus) {
-    double value;
-    char text[4];
-    double record[1];
-    EXPECT_EQ(qoraReadCaseRecord(-1), QORA_STATUS_BAD_FILE_HANDLE);
-    EXPECT_EQ(qoraWholeCaseIn(100, record), QORA_STATUS_BAD_FILE_HANDLE);
-    EXPECT_EQ(qoraSeekNextCase(99, 0), QORA_STATUS_BAD_FILE_HANDLE);
-    EXPECT_EQ(qoraGetValueNumeric(7, 1.0, &value), QORA_STATUS_BAD_FILE_HANDLE);
-    EXPECT_EQ(qoraGetValueChar(7, 1.0, text, 4), QORA_STATUS_BAD_FILE_HANDLE);
 }
 
 TEST(CaseCalls, SpecialValuesAreBitExact) {
