@@ -210,6 +210,8 @@ def main():
                         help="run every test against every mutant and write, one line per "
                              "mutant, the tests that kill it (slower; shows which tests "
                              "nothing else can replace)")
+    parser.add_argument("--exclude", metavar="REGEX",
+                        help="leave out the tests the regular expression names")
     parser.add_argument("--only", metavar="LOG",
                         help="try only the sampled mutants named in LOG (a run's output)")
     args = parser.parse_args()
@@ -228,7 +230,8 @@ def main():
     configure(build)
     restore_leftovers(build)
     build_cmd = ["cmake", "--build", build, "-j", args.jobs, "--target"] + TARGETS
-    test_cmd = ["ctest", "--timeout", "60", "-j", args.jobs, "-E", "InstallAndBuildExamples"]
+    excluded = "InstallAndBuildExamples" + ("|" + args.exclude if args.exclude else "")
+    test_cmd = ["ctest", "--timeout", "60", "-j", args.jobs, "-E", excluded]
     if not args.kills:
         test_cmd.append("--stop-on-failure")
     kills = open(args.kills, "w", encoding="utf-8") if args.kills else None
