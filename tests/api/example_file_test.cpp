@@ -26,10 +26,4 @@ TEST(ExampleFile, CommittedCopyMatchesTheSample) {
         << kExamplePath << " is stale: rerun with QORA_REGENERATE_EXAMPLE=1";
 }
 
-TEST(ExampleFile, DateValuesCountSecondsFromTheCalendarStart) {
-    EXPECT_EQ(fixture::DateValue(1582, 10, 14), 0.0);
-    EXPECT_EQ(fixture::DateValue(1582, 10, 15), 86400.0);
-    EXPECT_EQ(fixture::DateValue(1970, 1, 1), 12219379200.0);
-}
-
 }  // namespace

@@ -86,25 +86,6 @@ TEST_F(WriteHandle, SetVarNameChecksInOrderAndKeepsTheCallersSpelling) {
     EXPECT_EQ(qoraGetVarHandle(h(), "age", nullptr), QORA_STATUS_BAD_FILE_HANDLE);
 }
 
-TEST_F(WriteHandle, GetVarNamesHandsOutCopiesAndRefusesAnEmptyDictionary) {
-    int count = 3;
-    char** names = reinterpret_cast<char**>(&count);
-    int* types = &count;
-    EXPECT_EQ(qoraGetVarNames(h(), &count, &names, &types), QORA_STATUS_BAD_FILE);
-    EXPECT_EQ(count, 0);
-    EXPECT_EQ(names, nullptr);
-    EXPECT_EQ(types, nullptr);
-    Define({{"first", 0}, {"Second", 12}});
-    ASSERT_EQ(qoraGetVarNames(h(), &count, &names, &types), QORA_STATUS_OK);
-    ASSERT_EQ(count, 2);
-    EXPECT_EQ(names[0] + std::string("|") + std::to_string(types[0]) + names[1] + "|" +
-                  std::to_string(types[1]),
-              "first|0Second|12");
-    EXPECT_EQ(qoraFreeVarNames(names, types, count), QORA_STATUS_OK);
-    EXPECT_EQ(qoraFreeVarNames(nullptr, nullptr, 4), QORA_STATUS_OK);
-    EXPECT_EQ(qoraGetVarNames(h(), nullptr, &names, &types), QORA_STATUS_BAD_FILE_HANDLE);
-}
-
 // Stored labels keep 256 bytes, the short getter hands out 120, cut at whole
 // characters in UTF-8 mode.
 TEST_F(WriteHandle, LabelsAreCutAtWholeCharacters) {
