@@ -1,5 +1,6 @@
-// Plans that join the segments of very long strings: NULs a writer leaves at a
-// segment end, and plans from a file that would leave the case.
+// The segments of very long strings: the movers that cut them at whole
+// characters, the plans that join them again (NULs a writer leaves at a
+// segment end), and plans from a file that would leave the case.
 #include <gtest/gtest.h>
 
 #include <random>
@@ -7,14 +8,47 @@
 #include <tuple>
 #include <vector>
 
+#include "SaveDS.h"
 #include "SystemFileDechunker.h"
+#include "api_handles.h"
 #include "dserror.h"
 
-namespace {
-
+using namespace fixture;
 using Entry = SystemFileDechunker::Entry;
 
-}  // namespace
+TEST(Movers, CutVeryLongStringsIntoSegments) {
+    using SaveDS = SystemFileDataSource::SaveDS;
+    Utf8Mode utf8;
+    struct Cut {
+        const char* name;
+        int width;
+        std::string text;
+        std::vector<std::string> segments;  // each as written, padding included
+    };
+    const std::string e = "\xc3\xa9";  // two bytes
+    // clang-format off
+    const Cut cuts[] = {
+        {"multipleOf252", 504, std::string(504, 'b'),
+         {std::string(255, 'b') + ' ', std::string(249, 'b') + std::string(7, ' ')}},
+        {"blankAt254", 300, std::string(254, 'c') + ' ' + e + std::string(43, 'c'),
+         {std::string(254, 'c') + "  ", e + std::string(43, 'c') + "   "}},
+        {"characterAcross255", 300, std::string(254, 'd') + e + std::string(44, 'd'),
+         {std::string(254, 'd') + '\0' + ' ', e + std::string(44, 'd') + "  "}},
+    };
+    // clang-format on
+    for (const Cut& cut : cuts) {
+        SCOPED_TRACE(cut.name);
+        std::string source =
+            cut.text + std::string(8 * size_t(ValueUnits(cut.width)) - cut.width, ' ');
+        std::string expected;
+        for (const std::string& segment : cut.segments) expected += segment;
+        std::string output(expected.size(), '?');
+        SaveDS::EStringMover mover(reinterpret_cast<unsigned char*>(&output[0]), cut.width);
+        const auto* begin = reinterpret_cast<const unsigned char*>(source.data());
+        EXPECT_EQ(mover.Move(begin), begin + source.size());
+        EXPECT_EQ(output, expected);
+    }
+}
 
 // A writer that would cut a character fills bytes 252 to 254 with NULs: they
 // are not part of the string.
