@@ -97,35 +97,7 @@ double Number(const QORA_InputCaseIterator& it, int index) {
     return value;
 }
 
-std::string Text(const QORA_InputCaseIterator& it, int index, size_t width) {
-    return std::string(static_cast<const char*>(it.ValuePointer(index)), width);
-}
-
-class SystemFileIteratorTest : public ::testing::TestWithParam<DataForm> {
-  protected:
-    // The standard cases in this form, under the header's count given.
-    void Open(int cases, int32_t headerCount) {
-        b = SysFileBuilder(std::get<0>(GetParam()));
-        b.Compressed(std::get<1>(GetParam()));
-        StandardCases(b, cases);
-        b.header().caseCount = headerCount;
-        it.reset();  // an iterator goes before its source
-        source = std::make_unique<SystemFileDataSource>(b.WriteTemp().c_str());
-        it.reset(source->NewIterator(nullptr));
-    }
-
-    void ExpectCase(int i) {
-        ASSERT_TRUE(it->ReadCase()) << "case " << i;
-        EXPECT_EQ(Number(*it, 0), ExpectedX(i));
-        EXPECT_EQ(Text(*it, 1, 16), ExpectedS(i) + "    ");
-        EXPECT_EQ(Number(*it, 2), ExpectedY(i));
-    }
-
-    SysFileBuilder b;
-    std::unique_ptr<SystemFileDataSource> source;
-    std::unique_ptr<QORA_InputCaseIterator> it;
-};
-
+class SystemFileIteratorTest : public ::testing::TestWithParam<DataForm> {};
 INSTANTIATE_TEST_SUITE_P(Forms, SystemFileIteratorTest, AllDataForms(), DataFormName);
 
 }  // namespace
@@ -228,7 +200,12 @@ TEST_P(SystemFileIteratorTest, RandomWalkOfReadsAndSeeksFollowsTheModel) {
     std::mt19937 random(7);
     for (int32_t claimed : {n, -1, n + 3, 3}) {
         SCOPED_TRACE(claimed);
-        Open(n, claimed);
+        SysFileBuilder b(std::get<0>(GetParam()));
+        b.Compressed(std::get<1>(GetParam()));
+        StandardCases(b, n);
+        b.header().caseCount = claimed;
+        const auto source = std::make_unique<SystemFileDataSource>(b.WriteTemp().c_str());
+        const std::unique_ptr<QORA_InputCaseIterator> it(source->NewIterator(nullptr));
         EXPECT_TRUE(it->CanSeek());
         EXPECT_EQ(source->CaseCount(), claimed);
         for (int i = 0; i < n; ++i) ASSERT_TRUE(it->ReadCase()) << i;
@@ -256,7 +233,11 @@ TEST_P(SystemFileIteratorTest, RandomWalkOfReadsAndSeeksFollowsTheModel) {
                 EXPECT_EQ(Number(*it, 0), ExpectedX(int(current)));
             } else if (at < n) {
                 current = at++;
-                ExpectCase(int(current));
+                ASSERT_TRUE(it->ReadCase()) << current;
+                EXPECT_EQ(Number(*it, 0), ExpectedX(int(current)));
+                EXPECT_EQ(std::string(static_cast<const char*>(it->ValuePointer(1)), 16),
+                          ExpectedS(int(current)) + "    ");
+                EXPECT_EQ(Number(*it, 2), ExpectedY(int(current)));
             } else {
                 ASSERT_FALSE(it->ReadCase()) << at;
                 ASSERT_FALSE(it->ReadCase()) << at;

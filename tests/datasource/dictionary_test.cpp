@@ -33,9 +33,6 @@ using Set = QORA_VariableSet;
 class DictionaryOnly : public QORA_DataSource {
   public:
     QORA_InputCaseIterator* NewIterator(void*) override { return nullptr; }
-    void SetRecord(int32_t type, const std::string& text) {
-        SetExtensionContent(type, 1, static_cast<int32_t>(text.size()), text.data());
-    }
 };
 
 Set VariableSet(const char* name, std::initializer_list<const char*> variables) {
@@ -120,30 +117,6 @@ TEST(VariableSetLine, LinesGiveTheirFieldsOrNothing) {
     // The length claims bytes that lie beyond the view's end in memory.
     const std::string memory = "$a=C 5 L xyz tail";
     EXPECT_EQ(Parsed(std::string_view(memory).substr(0, 10)), "nothing");
-}
-
-TEST(VariableSetLoad, MultipleResponseFamilyReadsBothRecordsAndMerges) {
-    DictionaryOnly source;
-    source.SetRecord(kMultRespExtension,
-                     "$a=C 1 A x y\n"
-                     "b=D1 1 0  p\n"  // written without its "$"
-                     "\n"
-                     "x\n"
-                     "$bad=Q junk\n"
-                     "$c=C 0  z");  // no final newline
-    source.SetRecord(kExtendedMultRespExtension, "$A=E 1 2 10 2 AA q r\n");
-    source.SetRecord(kVariableSetExtension, "vs= a b\n");
-
-    // $A of the extended record replaces $a.
-    const QORA_VariableSetList sets = LoadVariableSets(source, QORA_SetFamily::kMultipleResponse);
-    ASSERT_EQ(sets.size(), 3u);
-    EXPECT_EQ(Describe(sets[0]), "2|$A|10|AA|1|q r ");
-    EXPECT_EQ(Describe(sets[1]), "2|$b|1||0|p ");
-    EXPECT_EQ(Describe(sets[2]), "1|$c|||0|z ");
-    const QORA_VariableSetList plain = LoadVariableSets(source, QORA_SetFamily::kVariableSets);
-    ASSERT_EQ(plain.size(), 1u);
-    EXPECT_EQ(Describe(plain[0]), "0|vs|||0|a b ");
-    EXPECT_TRUE(LoadVariableSets(DictionaryOnly(), QORA_SetFamily::kVariableSets).empty());
 }
 
 TEST(VariableSetPrune, RemovesUnknownNamesThenEmptySets) {
