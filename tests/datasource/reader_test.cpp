@@ -1,21 +1,126 @@
-// What the reader makes of dictionaries that other writers get wrong, in both
-// byte orders: labels, missing values, weights, continuations, names and sets.
+// Opening files built byte by byte, in both byte orders: what the reader makes
+// of dictionaries that other writers get wrong (labels, missing values,
+// weights, continuations, names, sets); the records with handlers of their
+// own, their bytes written and read back; and malformed and truncated files,
+// which fail the open with their internal error number and condition, never
+// with a crash, a hang or a huge allocation.
 #include <gtest/gtest.h>
 
+#include <array>
 #include <cstring>
+#include <exception>
+#include <memory>
 #include <string>
 #include <tuple>
+#include <utility>
 #include <vector>
 
 #include "HeaderSettings.h"
-#include "reader_support.h"
+#include "SystemFileDataSource.h"
+#include "SystemFileExtensionRecord.h"
+#include "dserror.h"
+#include "encoding_scope.h"
+#include "memory_source.h"
+#include "sysfile_builder.h"
 #include "variableset.h"
 
 using namespace fixture;
+using namespace std::string_literals;
 
 namespace {
 
-class Reader : public ByteOrders {};
+// How an open failed: the internal error number and the failed condition.
+struct OpenFailure {
+    long number = 0;  // 0: the open succeeded
+    std::string condition;
+    std::string text;
+};
+
+std::unique_ptr<SystemFileDataSource> OpenFixture(const std::string& path) {
+    return std::make_unique<SystemFileDataSource>(path.c_str());
+}
+
+OpenFailure FailureOf(const std::string& path) {
+    OpenFailure failure;
+    try {
+        SystemFileDataSource source(path.c_str());
+    } catch (const ErrorText& e) {
+        failure.text = e.Text();
+        try {
+            std::rethrow_if_nested(e);
+            failure.number = -1;  // not a format error
+        } catch (const SystemFileException& inner) {
+            failure.number = inner.Number();
+            failure.condition = inner.Condition();
+        }
+    }
+    return failure;
+}
+
+OpenFailure FailureOf(const fixture::SysFileBuilder& b) { return FailureOf(b.WriteTemp()); }
+
+// A file with one of each kind of dictionary record.
+SysFileBuilder Full(Endian e) {
+    SysFileBuilder b(e);
+    b.Numeric("AGE").Label("Age").Missing({-1.0});
+    b.String("NAME", 20).Label("Name").MissingStrings({"x"});
+    b.Numeric("W").MissingRange(0.0, 1.0, 9.0);
+    b.ValueLabels({{1.0, "One"}, {2.0, "Two two two"}}, {1, 5});
+    b.Documents({"doc"});
+    b.IntegerInfo();
+    b.Extension(12, 4, {1, 2, 3, 4});
+    b.Case({1.0, "Ann", 2.0});
+    return b;
+}
+
+#define EXPECT_FAILS(source, num, cond)           \
+    do {                                          \
+        const OpenFailure f = FailureOf(source);  \
+        EXPECT_EQ(f.number, (num)) << f.text;     \
+        EXPECT_EQ(f.condition, (cond)) << f.text; \
+    } while (0)
+
+std::string Export(int32_t subtype, QORA_DataSource& source, HeaderSettings& settings) {
+    SystemFileExtensionRecord record;
+    FindExtensionHandler(subtype)->Export(source, settings, record);
+    return record.Text();
+}
+
+void Import(int32_t subtype, QORA_DataSource& source, HeaderSettings& settings,
+            const std::string& text) {
+    SystemFileExtensionRecord record;
+    record.SetText(text);
+    FindExtensionHandler(subtype)->Import(source, settings, record);
+}
+
+// The contents of the only record of a builder without variables.
+std::string Contents(const SysFileBuilder& b) {
+    const fixture::Bytes file = b.Build();
+    return std::string(file.begin() + 176 + 16, file.end() - 8);
+}
+
+// A value that fills the width, different at every position a segment may end.
+std::string Sample(int width) {
+    std::string text;
+    while (int(text.size()) < width) text += std::to_string(text.size()) + "|";
+    return text.substr(0, size_t(width));
+}
+
+// A value with the separators of the variable attributes record in it.
+const std::string kUnit = SysFileBuilder::AttributeText({{"Unit", {"km/h:"}}});
+
+struct Warnings : WarningSink {
+    std::vector<long> numbers;
+    void Warning(long number, const std::string&) override { numbers.push_back(number); }
+};
+
+std::string Repeat(const std::string& text, int n) {
+    std::string out;
+    while (n-- > 0) out += text;
+    return out;
+}
+
+class Reader : public ::testing::TestWithParam<Endian> {};
 INSTANTIATE_TEST_SUITE_P(Orders, Reader, ::testing::Values(Endian::Native, Endian::Swapped),
                          EndianName);
 
@@ -90,25 +195,22 @@ TEST(Reader, CreationStampOfTheHeaderFields) {
     }
 }
 
-TEST_P(Reader, WeightNamesTheFirstUnitOfAVariableOrNothing) {
+// Continuation records are not counted (two would be right for S, one for T);
+// the weight names the first unit of a numeric variable among the records as
+// they stand, or nothing.
+TEST_P(Reader, ContinuationsAreNotCountedAndTheWeightNamesAVariable) {
     SysFileBuilder b(GetParam());
-    b.String("S", 20);
-    b.Weight(b.Numeric("W"));
-    EXPECT_EQ(OpenFixture(b.WriteTemp())->GetCaseWeight(), 1);
-    for (int32_t index : {2, 0, -5, 5, 99}) {  // continuation, none, out of range
-        b.header().weightIndex = index;
-        EXPECT_EQ(OpenFixture(b.WriteTemp())->GetCaseWeight(), -1) << index;
-    }
-}
-
-TEST_P(Reader, ContinuationRecordsAreNotCounted) {
-    SysFileBuilder b(GetParam());
-    b.String("S", 20).Continuations(5);  // two would be right
+    b.String("S", 20).Continuations(5);
     b.String("T", 9).Continuations(0);
-    b.Numeric("N");
+    b.Weight(b.Numeric("W"));
     auto source = OpenFixture(b.WriteTemp());
     ASSERT_EQ(source->ColumnCount(), 3);
     EXPECT_EQ(source->ValueCount(), 3 + 2 + 1);
+    EXPECT_EQ(source->GetCaseWeight(), 2);
+    for (int32_t index : {2, 7, 0, -5, 9, 99}) {  // continuation, string, none, out of range
+        b.header().weightIndex = index;
+        EXPECT_EQ(OpenFixture(b.WriteTemp())->GetCaseWeight(), -1) << index;
+    }
 }
 
 TEST_P(Reader, RepeatedAndInvalidNamesAreRenamed) {
@@ -125,21 +227,369 @@ TEST_P(Reader, RepeatedAndInvalidNamesAreRenamed) {
     EXPECT_EQ(names, (std::vector<std::string>{"age", "v2", "v1", "v3", "v4", "v5"}));  // V1 taken
 }
 
+// Lines without their "$", blank, malformed or without a final newline; a set
+// of the extended record replaces its namesake; members the file lacks go, and
+// so do sets left empty.
 TEST_P(Reader, SetsLoseMembersTheFileDoesNotHave) {
     SysFileBuilder b(GetParam());
     b.Numeric("A");
     b.Numeric("B");
-    b.MultipleResponseSets({SysFileBuilder::CategorySetLine("$ab", "Set", {"a", "GONE", "B"}),
-                            SysFileBuilder::CategorySetLine("$none", "X", {"GONE"})});
+    b.TextExtension(kMultRespExtension,
+                    "$ab=C 3 Set a GONE B\nb=D1 1 0  A\n\nx\n$bad=Q junk\n"
+                    "$none=C 1 X GONE\n$c=C 0  B");
+    b.ExtendedMultipleResponseSets({"$C=E 1 2 10 2 CC A B"});
     b.VariableSets({SysFileBuilder::VariableSetLine("Group", {"A", "B"})});
     auto source = OpenFixture(b.WriteTemp());
+    std::string found;
+    for (auto family : {QORA_SetFamily::kMultipleResponse, QORA_SetFamily::kVariableSets})
+        for (const QORA_VariableSet& set : LoadVariableSets(*source, family)) {
+            found += set.GetName() + "|" + set.GetValue() + "|" + set.GetLabel() + "|" +
+                     std::to_string(set.GetFlags()) + "|";
+            for (const std::string& v : set.GetVariables()) found += v + " ";
+        }
+    EXPECT_EQ(found, "$ab||Set|0|a B $b|1||0|A $C|10|CC|1|A B Group|||0|A B ");
+}
 
-    const QORA_VariableSetList mr = LoadVariableSets(*source, QORA_SetFamily::kMultipleResponse);
-    ASSERT_EQ(mr.size(), 1u);
-    EXPECT_EQ(mr[0].GetName(), "$ab");
-    EXPECT_EQ(mr[0].GetLabel(), "Set");
-    EXPECT_EQ(mr[0].GetVariables(), (std::vector<std::string>{"a", "B"}));
-    const QORA_VariableSetList groups = LoadVariableSets(*source, QORA_SetFamily::kVariableSets);
-    ASSERT_EQ(groups.size(), 1u);
-    EXPECT_EQ(groups[0].GetVariables(), (std::vector<std::string>{"A", "B"}));
+// Display values out of range, attributes that do not parse or name nobody.
+TEST_P(Reader, DisplayAndAttributesAreReadWithinTheirRanges) {
+    SysFileBuilder b(GetParam());
+    b.Numeric("A");
+    b.Numeric("B");
+    b.String("C", 12);
+    b.DisplayParams({{3, 12, 1}, {1, 0, 2}, {5, 70000, 7}});
+    b.FileAttributes(kUnit).FileAttributes("Note('x");  // the second does not parse
+    b.TextExtension(kVariableAttributesExtension, ":" + kUnit + "/A:" + kUnit);  // no first name
+    // An unknown variable is skipped; the first item that does not parse ends the record.
+    b.VariableAttributes({{"nobody", kUnit}, {"b", kUnit}, {"C", "Unit(x)\n"}, {"A", kUnit}});
+    auto source = OpenFixture(b.WriteTemp());
+
+    EXPECT_EQ(source->FileAttributes().ValuesOf("Unit"), Attributes::Values{"km/h:"});
+    // Width 0 keeps the variable's own; level and alignment keep 2 bits, width 16.
+    const std::array<int, 4> expected[3] = {
+        {3, 12, 1, 0}, {1, QORA_Variable(0).GetColumnWidth(), 2, 1}, {1, 70000 & 0xFFFF, 3, 0}};
+    for (int k = 0; k < 3; ++k) {
+        const QORA_Variable& v = source->GetVariable(k);
+        EXPECT_EQ((std::array<int, 4>{v.GetMeasureLevel(), v.GetColumnWidth(), v.GetAlignment(),
+                                      v.GetAttributes().Size()}),
+                  expected[k]);
+    }
+}
+
+TEST_P(Reader, CaseCountFollowsItsMarkerAndOnlyRises) {
+    auto reversed = [](int64_t v) { return int64_t(__builtin_bswap64(uint64_t(v))); };
+    // header count, record count, marker (0: a record of one unit), result
+    const std::array<int64_t, 4> rows[] = {
+        {-1, reversed(9), reversed(1), 9}, {7, 5, 1, 7}, {7, 9, 1, 9}, {-1, 9, 0, 9}};
+    for (const auto& [header, count, marker, expected] : rows) {
+        SysFileBuilder b(GetParam());
+        b.header().caseCount = int32_t(header);
+        marker ? b.CaseCount64(count, marker) : b.Extension(kCaseCountExtension, 8, b.Int64(count));
+        EXPECT_EQ(OpenFixture(b.WriteTemp())->Settings().fCaseCount, expected) << count;
+    }
+}
+
+// Every file has YEAR_, NAME (two units), MONTH_ and DATE_, for the date
+// variable information.
+TEST_P(Reader, MalformedRecordsFailTheOpen) {
+    auto file = [&] {
+        SysFileBuilder b(GetParam());
+        b.Numeric("YEAR_");
+        b.String("NAME", 12);
+        b.Numeric("MONTH_");
+        b.String("DATE_", 10);
+        return b;
+    };
+    const std::tuple<int32_t, int32_t, int32_t, std::string> rows[] = {
+        {kIntegerInfoExtension, 4, 7, "rec.NUnits() == 8"},
+        {kIntegerInfoExtension, 8, 8, "rec.UnitSize() == 4"},
+        {kFloatInfoExtension, 4, 3, "rec.UnitSize() == sizeof(double)"},
+        {kFloatInfoExtension, 8, 4, "rec.NUnits() == 3"},
+        {kDisplayExtension, 8, 6, "rec.UnitSize() == sizeof(int32)"},
+        {kDisplayExtension, 4, 3, "rec.NUnits()== src.ColumnCount()*3"},
+        {kCaseCountExtension, 4, 4, "rec.UnitSize() == sizeof(int64)"},
+        {kCaseCountExtension, 8, 3, "rec.NUnits() == 1 || rec.NUnits() == 2"},
+        {kFileAttributesExtension, 2, 4, "rec.UnitSize() == sizeof(char)"},
+        {kEncodingExtension, 2, 3, "rec.UnitSize() == sizeof(char)"},
+        {kDateInfoExtension, 8, 6, "rec.UnitSize() == 4"},
+    };
+    for (const auto& [subtype, unitSize, nUnits, condition] : rows) {
+        SysFileBuilder b = file();
+        b.Extension(subtype, unitSize, Bytes(size_t(unitSize * nUnits), 1));
+        EXPECT_FAILS(b, kErrBadFormat, condition);
+    }
+    const std::pair<std::vector<int32_t>, std::string> dates[] = {
+        {{0, 1, 11, 1, 1, 1}, "0 <= nDateVars && nDateVars < QORA_TrendsInfo::eMaxDateVars"},
+        {{0, 1, 4, 1, 1, 1, 1, 2, 1, 4, 4, 1, 0, 0, 0}, "nElements >= 3*nDateVars+6"},
+        {{0, 1, 0, 1, 1, 0, 0, 0, 0, 0, 0, 0}, "nElements <= 3*nDateVars+9"},
+        {{0, 1}, "nElements >= kFixedUnits"},
+        {{0, 1, 1, 1, 1, 1, 6, 2, 1, 0, 0, 0}, "iVar < nVars"},
+        {{0, 1, 1, 1, 1, 1, 1, 2, 1, 4, 4, 1},
+         "iDateVar < nDateVars || iType == e_DATKEY || iType == e_NONE"},
+    };
+    for (const auto& [units, condition] : dates) {
+        SysFileBuilder b = file();
+        b.DateInfo(units);
+        EXPECT_FAILS(b, kErrBadFormat, condition);
+    }
+    // A frame without units, which the reader refuses before any handler sees it.
+    SystemFileDataSource source;
+    EXPECT_THROW(ImportExtension(kEncodingExtension, source, source.Settings(), {1, 0}),
+                 SystemFileException);
+}
+
+TEST_P(Reader, HeaderFaults) {
+    SysFileBuilder b(GetParam());
+    EXPECT_FAILS(b.WriteTemp(Bytes{}, "empty.qsf"), kErrTooShort, "nRead == 4");
+    EXPECT_FAILS(b.WriteTemp(Bytes{'$', 'F', 'L'}, "three.qsf"), kErrTooShort, "nRead == 4");
+    EXPECT_FAILS(b.WriteTemp(Truncated(b.Build(), 100), "short.qsf"), kErrTooShort,
+                 "nRead == len1");
+    b.header().magic = "$FL3";
+    EXPECT_FAILS(b, kErrBadFormat, "std::string(magic) == \"$FL2\"");
+    EXPECT_NE(FailureOf(b).text.find("1204"), std::string::npos);
+}
+
+TEST_P(Reader, RecordSequenceFaults) {
+    SysFileBuilder b(GetParam());
+    b.Numeric("X");
+    b.EndRecord(false);
+    EXPECT_FAILS(b, kErrTooShort, "len == sizeof(recType)");
+    b.EndRecord(true);
+    const Bytes whole = b.Build();
+    EXPECT_FAILS(b.WriteTemp(Truncated(whole, whole.size() - 2), "f.qsf"), kErrTooShort,
+                 "len == sizeof(padding)");
+    for (int32_t type : {4, 5, 8, 1, 0, -1, 1000}) {
+        SysFileBuilder c(GetParam());
+        c.Numeric("X");
+        c.RawRecord(c.Int32s({type, 0, 0}));
+        EXPECT_FAILS(c, kErrBadFormat, "false");
+    }
+}
+
+TEST_P(Reader, VariableRecordFaults) {
+    auto fails = [&](auto configure, long number, const char* condition) {
+        SysFileBuilder b(GetParam());
+        configure(b.Numeric("X"));
+        EXPECT_FAILS(b, number, condition);
+    };
+    for (int32_t type : {256, 32767, -2, INT32_MIN})
+        fails([&](Var& v) { v.TypeField(type); }, kErrBadFormat, "type >= -1 && type <= 255");
+    const char* const validCode = "QORA_Variable::IsValidMissingCode(code)";
+    for (int32_t code : {4, -4, -1, 1000, INT32_MIN})
+        fails([&](Var& v) { v.MissingRaw(code, {1.0, 2.0, 3.0}); }, kErrBadFormat, validCode);
+    fails([](Var& v) { v.Label("abc").LabelLengthField(-4); }, kErrBadFormat, "labelLen >= 0");
+    fails([](Var& v) { v.Label("abc").LabelLengthField(0x7FFFFFF0); }, kErrTooShort,
+          "len == paddedLen");
+    fails([](Var& v) { v.MissingRaw(3, {1.0}); }, kErrTooShort, "len == 8*abs(code)");
+
+    SysFileBuilder b(GetParam());
+    b.Numeric("X");
+    b.Extension(12, 1, {0});
+    b.Numeric("LATE");
+    EXPECT_FAILS(b, kErrBadFormat, "!variablesClosed");
+}
+
+TEST_P(Reader, ValueLabelRecordFaults) {
+    auto fails = [&](auto configure, long number, const char* condition) {
+        SysFileBuilder b(GetParam());
+        b.String("S", 20);
+        b.Numeric("N");
+        ValueLabelSet set;
+        set.labels = {{1.0, "One"}};
+        set.slots = {4};
+        configure(set);
+        b.ValueLabels(set);
+        EXPECT_FAILS(b, number, condition);
+    };
+    fails([](ValueLabelSet& s) { s.labelCount = 0x7FFFFFFF; }, kErrTooShort,
+          "len == header.size()");
+    fails([](ValueLabelSet& s) { s.omitSecond = true; }, kErrBadFormat, "h[0] == 4");
+    fails([](ValueLabelSet& s) { s.secondType = 3; }, kErrBadFormat, "h[0] == 4");
+    fails([](ValueLabelSet& s) { s.variableCount = 0; }, kErrBadFormat, "h[1] > 0");
+    fails([](ValueLabelSet& s) { s.variableCount = -3; }, kErrBadFormat, "h[1] > 0");
+    fails([](ValueLabelSet& s) { s.variableCount = 0x7FFFFFFF; }, kErrTooShort,
+          "len == nVars*sizeof(int32)");
+    const char* const validSlot = "slots.IsValidSlot(slot)";
+    for (int32_t slot : {0, -1, 2, 3, 5, 99, INT32_MIN})  // 2, 3: units of S after its first
+        fails([&](ValueLabelSet& s) { s.slots = {4, slot}; }, kErrBadFormat, validSlot);
+}
+
+TEST_P(Reader, DocumentAndExtensionFaults) {
+    SysFileBuilder d(GetParam());
+    d.Documents({"a"}, 0x7FFFFFFF);
+    EXPECT_FAILS(d, kErrTooShort, "len == nLines*80");
+    SysFileBuilder n(GetParam());
+    n.Documents({}, -1);
+    EXPECT_FAILS(n, kErrBadFormat, "nLines >= 0");
+
+    auto fails = [&](int32_t size, int32_t count, Bytes contents, long number,
+                     const char* condition) {
+        SysFileBuilder b(GetParam());
+        b.Extension(12, size, count, contents);
+        EXPECT_FAILS(b, number, condition);
+    };
+    fails(0, 4, {1, 2, 3, 4}, kErrBadFormat, "h[1] > 0 && h[2] > 0");
+    fails(4, 0, {}, kErrBadFormat, "h[1] > 0 && h[2] > 0");
+    fails(-4, -4, {}, kErrBadFormat, "h[1] > 0 && h[2] > 0");
+    fails(1, 1000, {1, 2, 3}, kErrTooShort, "len == h[2]*h[1]");
+    fails(0x7FFFFFFF, 0x7FFFFFFF, {}, kErrTooShort, "len == h[2]*h[1]");
+    fails(65536, 65536, {}, kErrTooShort, "len == h[2]*h[1]");
+
+    SysFileBuilder frame(GetParam());
+    frame.RawRecord(frame.Int32s({7, 12}));
+    frame.EndRecord(false);
+    EXPECT_FAILS(frame, kErrTooShort, "len == 3*sizeof(int32)");
+}
+
+// Every cut inside the dictionary fails cleanly; after it the open succeeds.
+TEST_P(Reader, EveryTruncationFailsCleanly) {
+    const SysFileBuilder b = Full(GetParam());
+    const Bytes whole = b.Build();
+    const size_t dataStart = b.DataStart();
+    for (size_t size = 0; size < whole.size(); ++size) {
+        const OpenFailure f = FailureOf(b.WriteTemp(Truncated(whole, size), "cut.qsf"));
+        if (size < dataStart)
+            EXPECT_TRUE(f.number == kErrTooShort || f.number == kErrBadFormat) << size << f.text;
+        else
+            EXPECT_EQ(f.number, 0) << size << ": " << f.text;
+    }
+}
+
+// Any single corrupted byte opens or fails with a format error; nothing else.
+TEST_P(Reader, CorruptedBytesNeverEscapeTheChecks) {
+    const SysFileBuilder b = Full(GetParam());
+    const Bytes whole = b.Build();
+    for (size_t at = 0; at < b.DataStart(); ++at) {
+        Bytes bytes = whole;
+        bytes[at] = at % 2 ? 0x80 : 0xFF;  // a sign bit or a huge count
+        const OpenFailure f = FailureOf(b.WriteTemp(bytes, "bad.qsf"));
+        EXPECT_TRUE(f.number == 0 || f.number == kErrTooShort || f.number == kErrBadFormat)
+            << at << ": " << f.text;
+    }
+}
+
+// Exported as a writer does (14, 13), then imported as a reader does (13, 14)
+// into the dictionary the file holds: names, segments and sets come back whole.
+TEST(LongNamesRecords, ExportedBytesMatchTheFixtureAndReadBackWhole) {
+    MemorySource original;
+    original.Add(0, "age");
+    original.Add(0, "Income");
+    original.GetVariable(original.Add(600, "Remarks")).SetLabel("Free text");
+    const std::string set = "things= Income Remarks\n";
+    original.SetExtensionContent(kVariableSetExtension, 1, int32_t(set.size()), set.data());
+
+    MemorySource written(original);
+    HeaderSettings out;
+    const std::string strings = Export(kVeryLongStringsExtension, written, out);
+    const std::string names = Export(kLongNamesExtension, written, out);
+    EXPECT_EQ(strings, std::string("REMARKS=600\0\t", 13));
+    EXPECT_EQ(names, Contents(SysFileBuilder().LongNames(
+                         {{"AGE", "age"}, {"INCOME", "Income"}, {"REMARKS", "Remarks"}})));
+    EXPECT_EQ(out.fVeryLongStrings, (std::vector<std::pair<int, int>>{{2, 600}}));
+    EXPECT_EQ(written.GetExtension(kVariableSetExtension).Impl()->Content(),
+              "things= INCOME REMARKS\n");
+
+    MemorySource read(written);
+    HeaderSettings in;
+    Import(kLongNamesExtension, read, in, names);
+    Import(kVeryLongStringsExtension, read, in, strings);
+    ASSERT_EQ(read.ColumnCount(), original.ColumnCount());
+    for (int i = 0; i < read.ColumnCount(); ++i)
+        EXPECT_TRUE(read.GetVariable(i) == original.GetVariable(i))
+            << read.GetVariable(i).GetName();
+    EXPECT_EQ(read.GetExtension(kVariableSetExtension).Impl()->Content(), set);
+}
+
+// Each file fails to open with the condition, or opens with the number of
+// variables (6 while both strings are in segments) and reads its case.
+TEST_P(Reader, MalformedAndIgnoredRecords) {
+    const std::string names = "S600=Remarks\tT300=Other";
+    const struct {
+        std::string names, strings;
+        std::string value, stray;  // of one long value labels entry for Remarks, if any
+        int32_t nameLength;        // written over the entry's, if not 0
+        const char* condition;
+        int columns;
+    } rows[] = {
+        {"A=alpha\tB", "", "", "", 0, "i != notFound && extString[i] == '='", 0},
+        {"A=al=pha", "", "", "", 0, "j == len || extString[j] == '\\t'", 0},
+        {names, "S600=600\0\tT300=300\0\t"s, "", "", 0, "", 3},
+        {"", "S600=600\0\t"s, "", "", 0, "", 6},
+        {names + "\tABCDEFGHIJKLMNO=Remarks", "ABCDEFGHIJKLMNO=600\0\t"s, "", "", 0, "", 4},
+        {names + "\tABCDEFGHIJKLMNOP=Remarks", "ABCDEFGHIJKLMNOP=600\0\t"s, "", "", 0, "", 6},
+        {names, "S600=100600\0\tT300=300\0\t"s, "", "", 0, "", 6},
+        {names, "S600=700\0\tT300=300\0\t"s, "", "", 0, "", 5},
+        {names, "T300=0\0\tS600=100\0\t"s, "", "", 0, "", 6},
+        // R1 names the last two segments of Remarks as a string of width 348.
+        {names + "\tR1=REMAR1", "S600=600\0\tR1=348\0\t"s, "", "", 0, "", 4},
+        {names, "", "none", "", 0, "", 6},  // Remarks is still in segments: skipped
+        {names, "", "none", "0123456789", 0, "r+13 < endr", 0},
+        {names, "", std::string(601, 'v'), "", 0, "valLen <= varType", 0},
+        {names, "", "none", "", -7, "nameLength >= 0", 0},
+    };
+    for (const auto& row : rows) {
+        SysFileBuilder b(GetParam());
+        b.String("S600", 600).LongName("Remarks");
+        b.String("T300", 300).LongName("Other");
+        b.Numeric("N");
+        b.Case({Sample(600), Sample(300), 1.0});
+        if (!row.names.empty()) b.TextExtension(13, row.names);
+        if (!row.strings.empty()) b.TextExtension(14, row.strings);
+        if (!row.value.empty()) {
+            std::string entry =
+                Contents(SysFileBuilder(GetParam())
+                             .LongValueLabelsRecord({{"Remarks", 600, {{row.value, "Nil"}}}})) +
+                row.stray;
+            const fixture::Bytes nameLength = b.Int32(row.nameLength);
+            if (row.nameLength != 0)
+                entry.replace(entry.begin(), entry.begin() + 4, nameLength.begin(),
+                              nameLength.end());
+            b.Extension(21, 1, fixture::Bytes(entry.begin(), entry.end()));
+        }
+        const std::string path = b.WriteTemp();
+        const OpenFailure f = FailureOf(path);
+        EXPECT_EQ(f.condition, row.condition) << row.names << " " << f.text;
+        if (f.number != 0) continue;
+        auto source = OpenFixture(path);
+        EXPECT_EQ(source->ColumnCount(), row.columns) << row.names << " " << row.strings;
+        std::unique_ptr<QORA_InputCaseIterator> it(source->NewIterator(nullptr));
+        EXPECT_TRUE(it->ReadCase());
+    }
+}
+
+// The view the opening factory puts over a file in another encoding than the
+// interface's: widths, numbers bit for bit, cuts at whole characters, repaired
+// names and the warning.
+TEST(Transcoding, CodePageFileSeenInUtf8) {
+    EncodingScope scope(kUtf8);
+    const std::string zhong = "\xD6\xD0", zhongUtf8 = "\xE4\xB8\xAD";  // one character
+    SysFileBuilder b;
+    b.String("S10", 10).LongName(Repeat(zhong, 32));
+    b.String("T10", 10).LongName(Repeat(zhong, 31) + "ab");  // the same once cut to 64 bytes
+    b.String("HUGE", 20000);
+    b.Numeric("N");
+    b.String("BAD", 4).LongName("A\x81\x7F");  // no character in GBK
+    b.LongNames().VeryLongStrings().Encoding("GBK");
+    const double odd = FromBits(0x7FF8000000000001);
+    b.Case({Repeat(zhong, 5), Repeat(zhong, 4) + "\xD6", "h", odd, zhong + "\xD6"});
+    Warnings warnings;
+    const auto source = OpenForReading(b.WriteTemp().c_str(), &warnings);
+    EXPECT_EQ(warnings.numbers, std::vector<long>{kWarnNotUtf8});
+    std::string names;
+    for (int i = 0; i < source->ColumnCount(); ++i)
+        names += source->GetVariable(i).GetName() + "/" +
+                 std::to_string(source->GetVariable(i).GetType()) + " ";
+    // The malformed name is renamed as the file is read, the repeated one
+    // after the conversion.
+    EXPECT_EQ(names, Repeat(zhongUtf8, 21) + "/30 v2/30 HUGE/32767 N/0 v1/12 ");
+
+    const std::unique_ptr<QORA_InputCaseIterator> it(source->NewIterator(nullptr));
+    ASSERT_TRUE(it->ReadCase());
+    auto Value = [&](int index, size_t bytes) {
+        return std::string(static_cast<const char*>(it->ValuePointer(index)), bytes);
+    };
+    EXPECT_EQ(Value(0, 32), Repeat(zhongUtf8, 5) + std::string(17, ' '));
+    // A malformed byte is shown as "?"; a value never passes its units.
+    EXPECT_EQ(Value(1, 32), Repeat(zhongUtf8, 4) + "?" + std::string(19, ' '));
+    EXPECT_EQ(std::memcmp(it->ValuePointer(3), &odd, 8), 0);
+    EXPECT_EQ(Value(4, 16), zhongUtf8 + "?" + std::string(12, ' '));
 }

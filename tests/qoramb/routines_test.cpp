@@ -1,9 +1,28 @@
-// The multibyte routines in UTF-8 mode and in code-page mode under single-byte
-// and double-byte code pages. Inputs sit in blocks of exactly their bytes; a
-// terminator is part of the bytes only where the row gives no length.
-#include "mbtest.h"
+// The multibyte routines, conversions and code pages, in UTF-8 mode and in
+// code-page mode under single-byte and double-byte code pages. Inputs sit in
+// heap blocks of exactly their bytes, so the sanitizer catches a read past a
+// length; a terminator is part of the bytes only where the row gives no length.
+// A conversion into a bounded destination without a length terminates the
+// result, with one it puts one blank after a result shorter than the
+// destination; a cut sets the error to 1, a substitution to 3.
+#include <gtest/gtest.h>
+
+#include <cstring>
+#include <memory>
+#include <string>
+
+#include "encoding_scope.h"  // with the code page and multibyte routines
+
+using namespace std::string_literals;
 
 namespace {
+
+// The bytes in a heap block of exactly their size, without terminator.
+std::unique_ptr<char[]> Exact(const std::string& bytes) {
+    std::unique_ptr<char[]> block(new char[bytes.size()]);
+    memcpy(block.get(), bytes.data(), bytes.size());
+    return block;
+}
 
 // A routine's result as text; size is that of the destination it fills, if any.
 using Routine = std::string (*)(const std::string& bytes, int arg, size_t size);
@@ -158,6 +177,71 @@ TEST(Routines, GenerationChangesWithModeAndConverter) {
     EXPECT_TRUE(SetCodePageConverter("936"));  // the same converter
     EXPECT_FALSE(SetCodePageConverter("no-such-encoding"));
     EXPECT_EQ(mbGeneration(), gbk);
+}
+
+// Each routine here writes into a bounded destination of the current encoding.
+using Into = int (*)(const char* src, int srcLen, char* dst, int dstSize, int* error);
+int ToUtf8(const char* src, int srcLen, char* dst, int dstSize, int* error) {
+    return mbCodePageToUtf8(nullptr, dst, dstSize, src, srcLen, error);
+}
+int FromUtf8(const char* src, int srcLen, char* dst, int dstSize, int* error) {
+    return mbUtf8ToCodePage(nullptr, dst, dstSize, src, srcLen, error);
+}
+
+TEST(Convert, CutsBlanksTerminatorsAndErrors) {
+    // The source with its length, the destination size, the result, the
+    // leading bytes of the destination and the error.
+    const std::tuple<Encoding, Into, std::string, int, int, int, std::string, int> rows[] = {
+        // clang-format off
+        {kCp1252, ToUtf8, "caf\xE9 \x80\0"s, -1, 16, 9, "caf\xC3\xA9 \xE2\x82\xAC\0"s, 0},
+        // Room for 3 bytes and the terminator: the second character would be split.
+        {kCp1252, ToUtf8, "\xE9\xE9\xE9\0"s, -1, 4, 2, "\xC3\xA9\0x"s, 1},
+        {kCp1252, ToUtf8, "\xE9\0"s, -1, 1, 0, "\0"s, 1},
+        // The cut is found in the bytes written, never past the destination.
+        {kCp1252, ToUtf8, "\xE9\xE9", 2, 3, 2, "\xC3\xA9 ", 1},
+        {kCp1252, ToUtf8, "\xE9\xE9", 1, 5, 2, "\xC3\xA9 xx", 0},
+        {kCp1252, ToUtf8, "a\0\xE9"s, 3, 8, 4, "a\0\xC3\xA9 "s, 0},  // a zero byte too
+        {kGbk, ToUtf8, "a\xD6\xD0\0"s, -1, 16, 4, "a\xE4\xB8\xAD\0"s, 0},
+        // A lead byte at the end of the given length is illegal input: substituted.
+        {kGbk, ToUtf8, "a\xD6", 2, 16, 2, "a? ", 3},
+        // To GBK, cut before the double-byte character that does not fit.
+        {kGbk, FromUtf8, "a\xE4\xB8\xAD\xE4\xB8\xAD", 7, 4, 3, "a\xD6\xD0 ", 1},
+        {kCp1252, FromUtf8, "a\xE4\xB8\xAD\xE2\x82\xAC\0"s, -1, 16, 3, "a?\x80\0"s, 3},
+        {kCp1252, FromUtf8, "\0"s, -1, 16, 0, "\0"s, 0},
+        // Malformed UTF-8: a lone lead byte, an invalid byte, overlong, surrogate.
+        {kCp1252, FromUtf8, "a\xC3", 2, 16, 2, "a? ", 3},
+        {kCp1252, FromUtf8, "a\xFF", 2, 16, 2, "a? ", 3},
+        {kCp1252, FromUtf8, "a\xC0\x80", 3, 16, 3, "a?? ", 3},
+        {kCp1252, FromUtf8, "a\xED\xA0\x80", 4, 16, 4, "a??? ", 3},
+        // Case mapping into a destination: a character that does not fit is left out.
+        {kUtf8, mbToUpper, "a\xC3\xA9\x62\0"s, -1, 4, 4, "A\xC3\x89\x42", 0},
+        {kUtf8, mbToUpper, "a\xC3\xA9\0"s, -1, 2, 1, "A\0"s, 1},
+        {kUtf8, mbToLower, "abc\xC3", 4, 8, 4, "abc\xC3", 3},
+        {kUtf8, mbToLower, "ABC", 2, 8, 2, "ab\0"s, 0},
+        {kLatin1, mbToLower, "\xC0\xC9\0"s, -1, 4, 2, "\xE0\xE9\0"s, 0},
+        // clang-format on
+    };
+    for (const auto& [enc, routine, src, srcLen, dstSize, result, dst, expectedError] : rows) {
+        EncodingScope scope(enc);
+        auto out = Exact(std::string(dstSize, 'x'));
+        int error = -7;
+        EXPECT_EQ(routine(Exact(src).get(), srcLen, out.get(), dstSize, &error), result) << src;
+        EXPECT_EQ(std::string(out.get(), dst.size()), dst) << src;
+        EXPECT_EQ(error, expectedError) << src;
+    }
+    EncodingScope scope(kUtf8);
+    char out[4];
+    EXPECT_EQ(mbToLower("AB", -1, out, sizeof out, nullptr), 2);
+}
+
+// The runtime locale's own locale and encoding, when it names a code page.
+TEST(Locale, SystemLocaleInfo) {
+    std::string locale, encoding;
+    EncodingScope gbk(kGbk);
+    ASSERT_TRUE(GetSystemLocaleInfo(locale, encoding));
+    EXPECT_EQ(locale + " " + encoding, "zh_Hans_CN GBK");
+    EncodingScope none({"C", "ISO-8859-1", 0});
+    EXPECT_FALSE(GetSystemLocaleInfo(locale, encoding));
 }
 
 }  // namespace

@@ -1,5 +1,6 @@
-// Plans that join the segments of very long strings: NULs a writer leaves at a
-// segment end, and plans from a file that would leave the case.
+// The segments of very long strings: the movers cut them at whole characters,
+// filling with NULs where one would be cut, and plans join them again; plans
+// from a file that would leave the case are refused.
 #include <gtest/gtest.h>
 
 #include <random>
@@ -7,27 +8,56 @@
 #include <tuple>
 #include <vector>
 
+#include "SaveDS.h"
 #include "SystemFileDechunker.h"
+#include "api_handles.h"
 #include "dserror.h"
 
-namespace {
-
+using namespace fixture;
 using Entry = SystemFileDechunker::Entry;
 
-}  // namespace
-
-// A writer that would cut a character fills bytes 252 to 254 with NULs: they
-// are not part of the string.
-TEST(DechunkerTest, NulsAtTheEndOfAFullSegmentAreDropped) {
-    std::string raw =
-        std::string(253, 'a') + std::string(2, '\0') + ' ' + std::string(47, 'b') + ' ';
-    SystemFileDechunker plan;
-    plan.Add(SystemFileDechunker::StringEntry(0, 300, 0, 0));
-    plan.Validate(38, 38);
-    std::string out(304, '?');
-    plan.Rebuild(reinterpret_cast<unsigned char*>(&raw[0]),
-                 reinterpret_cast<unsigned char*>(&out[0]));
-    EXPECT_EQ(out, std::string(253, 'a') + std::string(47, 'b') + "    ");
+TEST(Movers, CutVeryLongStringsIntoSegments) {
+    using SaveDS = SystemFileDataSource::SaveDS;
+    Utf8Mode utf8;
+    struct Cut {
+        const char* name;
+        int width;
+        std::string text;
+        std::vector<std::string> segments;  // each as written, padding included
+    };
+    const std::string e = "\xc3\xa9", zhong = "\xe4\xb8\xad";  // two bytes, three
+    // clang-format off
+    const Cut cuts[] = {
+        {"multipleOf252", 504, std::string(504, 'b'),
+         {std::string(255, 'b') + ' ', std::string(249, 'b') + std::string(7, ' ')}},
+        {"blankAt254", 300, std::string(254, 'c') + ' ' + e + std::string(43, 'c'),
+         {std::string(254, 'c') + "  ", e + std::string(43, 'c') + "   "}},
+        {"characterAcross255", 300, std::string(254, 'd') + e + std::string(44, 'd'),
+         {std::string(254, 'd') + '\0' + ' ', e + std::string(44, 'd') + "  "}},
+        {"threeBytesAcross255", 300, std::string(253, 'f') + zhong + std::string(44, 'f'),
+         {std::string(253, 'f') + std::string(2, '\0') + ' ', zhong + std::string(44, 'f') + ' '}},
+    };
+    // clang-format on
+    for (const Cut& cut : cuts) {
+        SCOPED_TRACE(cut.name);
+        std::string source =
+            cut.text + std::string(8 * size_t(ValueUnits(cut.width)) - cut.width, ' ');
+        std::string expected;
+        for (const std::string& segment : cut.segments) expected += segment;
+        std::string output(expected.size(), '?');
+        SaveDS::EStringMover mover(reinterpret_cast<unsigned char*>(&output[0]), cut.width);
+        const auto* begin = reinterpret_cast<const unsigned char*>(source.data());
+        EXPECT_EQ(mover.Move(begin), begin + source.size());
+        EXPECT_EQ(output, expected);
+        // Joined again, the NULs that stand for a cut character are dropped.
+        SystemFileDechunker plan;
+        plan.Add(SystemFileDechunker::StringEntry(0, uint32_t(cut.width), 0, 0));
+        plan.Validate(uint32_t(output.size() / 8), uint32_t(ValueUnits(cut.width)));
+        std::string joined(source.size(), '?');
+        plan.Rebuild(reinterpret_cast<unsigned char*>(&output[0]),
+                     reinterpret_cast<unsigned char*>(&joined[0]));
+        EXPECT_EQ(joined, source);
+    }
 }
 
 TEST(DechunkerTest, ValidationRefusesEntriesThatLeaveTheCases) {
