@@ -427,6 +427,10 @@ SysFileBuilder& SysFileBuilder::MultipleResponseSets(std::vector<std::string> li
     return TextExtension(7, Lines(lines));
 }
 
+SysFileBuilder& SysFileBuilder::ExtendedMultipleResponseSets(std::vector<std::string> lines) {
+    return TextExtension(19, Lines(lines));
+}
+
 SysFileBuilder& SysFileBuilder::VariableSets(std::vector<std::string> lines) {
     return TextExtension(5, Lines(lines));
 }

@@ -206,8 +206,9 @@ class SysFileBuilder {
     SysFileBuilder& VariableAttributes(std::vector<std::pair<std::string, std::string>> nameText);
     SysFileBuilder& Encoding(const std::string& name);
     SysFileBuilder& LongValueLabelsRecord(std::vector<LongValueLabels> entries);
-    SysFileBuilder& MultipleResponseSets(std::vector<std::string> lines);  // subtype 7
-    SysFileBuilder& VariableSets(std::vector<std::string> lines);          // subtype 5
+    SysFileBuilder& MultipleResponseSets(std::vector<std::string> lines);          // subtype 7
+    SysFileBuilder& ExtendedMultipleResponseSets(std::vector<std::string> lines);  // 19
+    SysFileBuilder& VariableSets(std::vector<std::string> lines);                  // subtype 5
 
     // Bytes placed as they are among the dictionary records.
     SysFileBuilder& RawRecord(Bytes bytes);
