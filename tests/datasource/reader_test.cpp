@@ -18,9 +18,9 @@
 #include "HeaderSettings.h"
 #include "SystemFileDataSource.h"
 #include "SystemFileExtensionRecord.h"
+#include "datasrc.h"
 #include "dserror.h"
 #include "encoding_scope.h"
-#include "memory_source.h"
 #include "sysfile_builder.h"
 #include "variableset.h"
 
@@ -466,6 +466,21 @@ TEST_P(Reader, CorruptedBytesNeverEscapeTheChecks) {
             << at << ": " << f.text;
     }
 }
+
+namespace {
+
+// A dictionary without cases.
+class MemorySource : public QORA_DataSource {
+  public:
+    QORA_InputCaseIterator* NewIterator(void*) override { return nullptr; }
+    int Add(int type, const char* name) {
+        QORA_Variable var(type);
+        var.SetName(name);
+        return AppendVariable(var);
+    }
+};
+
+}  // namespace
 
 // Exported as a writer does (14, 13), then imported as a reader does (13, 14)
 // into the dictionary the file holds: names, segments and sets come back whole.
