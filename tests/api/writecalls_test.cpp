@@ -82,6 +82,10 @@ TEST(WriteFailures, FailedWritesReportTheirStatus) {
         status = qoraCommitCaseRecord(full.get());
     EXPECT_EQ(status, QORA_STATUS_WRITE_FAILED);
     EXPECT_EQ(qoraCommitCaseRecord(full.get()), QORA_STATUS_WRITE_FAILED);
+    // The close reports what the file lacks, and frees the slot all the same.
+    EXPECT_EQ(qoraCloseWrite(full.get()), QORA_STATUS_WRITE_FAILED);
+    EXPECT_EQ(qoraCloseWrite(full.get()), QORA_STATUS_BAD_FILE_HANDLE);
+    full.Forget();
 
     // A half-built case is dropped at the close.
     fixture::SysFileBuilder b;
