@@ -221,6 +221,8 @@ class Driver {
         const int status = numeric ? qoraSetValueNumeric(open.handle, varHandle, number)
                                    : qoraSetValueChar(open.handle, varHandle, text.c_str());
         if (status != 0) return;
+        // A handle drawn at random may name a variable too.
+        if (index == open.model.vars.size()) index = size_t(varHandle) - 1;
         if (!open.pending) open.pending = BlankCase(open.model.vars);
         Value& value = (*open.pending)[index];
         if (numeric) {
