@@ -25,8 +25,6 @@ class WriteBehind {
     bool Append(const void* data, uint32_t count);
     // Writes what is collected, which is then given up whatever happens.
     bool Flush();
-    // After one write has failed nothing more is written: bytes that belong
-    // after the ones lost would leave a gap that a reader takes for data.
 
   private:
     bool WriteWholeStretches();
@@ -38,5 +36,7 @@ class WriteBehind {
     std::unique_ptr<unsigned char[]> fBuffer;  // made at the first Put
     int64_t fStart = 0;
     uint32_t fLength = 0;
+    // After one write has failed nothing more is written: bytes that belong
+    // after the ones lost would leave a gap that a reader takes for data.
     bool fFailed = false;
 };
