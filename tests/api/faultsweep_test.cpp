@@ -16,7 +16,7 @@
 namespace {
 
 // Cases of the file an append extends: 41 of 6 units leave the last
-// compressed block half filled.
+// compressed block partly filled (six of its eight codes).
 constexpr int kBefore = 41;
 constexpr int kAdded = 300;  // cases a session writes: several buffers' worth
 
