@@ -21,7 +21,7 @@ int ResolveVariable(const FileEntry& entry, double varHandle, const ValueSlot** 
     // The index is then checked against the table as an integer, which
     // spares converting the table's size on every call. No handle passes an
     // empty table, which is told apart only then.
-    const bool inInt = varHandle >= 1.0 && varHandle < 2147483648.0;
+    const bool inInt = varHandle >= 1.0 && varHandle < double(INT32_MAX) + 1.0;
     const uint32_t index = inInt ? uint32_t(int32_t(varHandle)) - 1 : UINT32_MAX;
     if (QORA_UNLIKELY(index >= slots.size()))
         return slots.empty() ? QORA_STATUS_DICT_NOT_COMMITTED : QORA_STATUS_BAD_VAR_HANDLE;

@@ -126,11 +126,13 @@ void QORA_VLMapImpl::InsertAll(std::vector<Pair> pairs) {
                 std::swap(pairs[j], pairs[j - 1]);
     }
     size_t kept = 0;
-    for (Pair& pair : pairs) {
-        if (kept > 0 && pairs[kept - 1].key == pair.key)
-            pairs[kept - 1].label = std::move(pair.label);
-        else if (&pairs[kept++] != &pair)
-            pairs[kept - 1] = std::move(pair);
+    for (size_t i = 0; i < pairs.size(); ++i) {
+        if (kept > 0 && pairs[kept - 1].key == pairs[i].key) {
+            pairs[kept - 1].label = std::move(pairs[i].label);
+        } else {
+            if (kept != i) pairs[kept] = std::move(pairs[i]);
+            ++kept;
+        }
     }
     pairs.erase(pairs.begin() + std::ptrdiff_t(kept), pairs.end());
     pairs.shrink_to_fit();
