@@ -5,7 +5,9 @@
 
 namespace {
 
-enum : size_t { kBlockBytes = 64 * 1024 };
+// Blocks double from the first up to the largest, so that a small
+// dictionary takes little and a large one few blocks.
+enum : size_t { kFirstBlockBytes = 256, kLargestBlockBytes = 64 * 1024 };
 
 }  // namespace
 
@@ -13,6 +15,7 @@ void NameIndex::Reset(size_t count) {
     fBlocks.clear();
     fNext = nullptr;
     fRoom = 0;
+    fBlockBytes = 0;
     fTable = NameTable(count);
 }
 
@@ -22,7 +25,8 @@ bool NameIndex::Insert(std::string_view key, int32_t index) {
 
 std::string_view NameIndex::Keep(std::string_view key) {
     if (key.size() > fRoom) {
-        fRoom = std::max<size_t>(kBlockBytes, key.size());
+        fBlockBytes = std::clamp<size_t>(2 * fBlockBytes, kFirstBlockBytes, kLargestBlockBytes);
+        fRoom = std::max(fBlockBytes, key.size());
         fBlocks.emplace_back(new char[fRoom]);
         fNext = fBlocks.back().get();
     }

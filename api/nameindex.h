@@ -30,5 +30,6 @@ class NameIndex {
     std::vector<std::unique_ptr<char[]>> fBlocks;
     char* fNext = nullptr;  // the free bytes of the current block
     size_t fRoom = 0;
+    size_t fBlockBytes = 0;  // the size of the last block made
     NameTable fTable{0};
 };
