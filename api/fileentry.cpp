@@ -37,26 +37,24 @@ SystemFileDataSource* FileEntry::SystemFileOrParent() const {
 }
 
 int FileEntry::BuildNameIndex() {
-    fNameIndex.clear();
-    fNameIndex.reserve(size_t(fpDataSource->ColumnCount()));
+    fNameIndex.Reset(size_t(fpDataSource->ColumnCount()));
     for (int i = 0; i < fpDataSource->ColumnCount(); ++i) {
-        if (!fNameIndex.emplace(fpDataSource->GetVariable(i).GetKey(), i).second)
+        if (!fNameIndex.Insert(fpDataSource->GetVariable(i).GetKey(), i))
             return QORA_STATUS_BAD_FILE;
     }
     return QORA_STATUS_OK;
 }
 
 void FileEntry::AddToNameIndex(int index) {
-    fNameIndex[fpDataSource->GetVariable(index).GetKey()] = index;
+    fNameIndex.Insert(fpDataSource->GetVariable(index).GetKey(), index);
 }
 
 int FileEntry::FindVariable(const char* name) const {
     if (name == nullptr) return -1;
     while (*name == ' ') ++name;
     // The same key a variable makes of its own name, so both sides agree.
-    const auto found = fNameIndex.find(MakeLookupKey(name, std::strlen(name)));
-    if (found == fNameIndex.end() || !fpDataSource->IsValidIndex(found->second)) return -1;
-    return found->second;
+    const int index = fNameIndex.Find(MakeLookupKey(name, std::strlen(name)));
+    return fpDataSource->IsValidIndex(index) ? index : -1;
 }
 
 void FileEntry::BuildValueSlots() {

@@ -5,12 +5,12 @@
 #include <cstdint>
 #include <memory>
 #include <string>
-#include <unordered_map>
 #include <vector>
 
 #include "datasrc.h"
 #include "extension.h"
 #include "multrespcollector.h"
+#include "nameindex.h"
 #include "qoraio32.h"
 
 class QORA_InputCaseIterator;
@@ -28,9 +28,6 @@ struct ValueSlot {
     int32_t offset;
     int32_t width;
 };
-
-// Normalised name to dictionary index.
-using NameIndex = std::unordered_map<std::string, int32_t>;
 
 struct FileEntry {
     FileEntry(std::unique_ptr<QORA_DataSource> dataSource, OpenMode mode);

@@ -2,6 +2,7 @@
 // of the current case, and the special values of the numeric model.
 #include <algorithm>
 #include <cstddef>
+#include <cstdint>
 #include <cstring>
 #include <new>
 
@@ -16,13 +17,15 @@ namespace {
 // truncated toward zero), or the status that refuses it.
 int ResolveVariable(const FileEntry& entry, double varHandle, const ValueSlot** slot) {
     const std::vector<ValueSlot>& slots = entry.fValueSlots;
-    // Compared as a double first: NaN and handles beyond int never convert.
-    // Signed conversions: the unsigned ones cost a branch each. No handle
-    // passes an empty table, which is told apart only then.
-    const auto count = static_cast<std::ptrdiff_t>(slots.size());
-    if (!(varHandle >= 1.0 && varHandle < double(count + 1)))
+    // Bounded as a double first: NaN and handles beyond int never convert.
+    // The index is then checked against the table as an integer, which
+    // spares converting the table's size on every call. No handle passes an
+    // empty table, which is told apart only then.
+    const bool inInt = varHandle >= 1.0 && varHandle < double(INT32_MAX) + 1.0;
+    const uint32_t index = inInt ? uint32_t(int32_t(varHandle)) - 1 : UINT32_MAX;
+    if (QORA_UNLIKELY(index >= slots.size()))
         return slots.empty() ? QORA_STATUS_DICT_NOT_COMMITTED : QORA_STATUS_BAD_VAR_HANDLE;
-    *slot = &slots[std::ptrdiff_t(varHandle) - 1];
+    *slot = &slots[index];
     return QORA_STATUS_OK;
 }
 
@@ -114,9 +117,10 @@ int QORA_API qoraSeekNextCase(int handle, int caseNumber) {
     });
 }
 
+// The value is cleared only when the call fails, which spares the store
+// and its test in the loop of a caller fetching every value of a case.
 int QORA_API qoraGetValueNumeric(int handle, double varHandle, double* value) {
-    if (value != nullptr) *value = 0.0;
-    return EntryCall(handle, AccessReadCases, kCatchCaseIn, [&](FileEntry& entry) {
+    const int status = EntryCall(handle, AccessReadCases, kCatchCaseIn, [&](FileEntry& entry) {
         if (entry.fCaseState != CaseLoaded) return int(QORA_STATUS_NO_CURRENT_CASE);
         const ValueSlot* slot;
         const int status = ResolveVariable(entry, varHandle, &slot);
@@ -126,6 +130,8 @@ int QORA_API qoraGetValueNumeric(int handle, double varHandle, double* value) {
         std::memcpy(value, ValueAt(entry, *slot), sizeof *value);
         return int(QORA_STATUS_OK);
     });
+    if (status != QORA_STATUS_OK && value != nullptr) *value = 0.0;
+    return status;
 }
 
 int QORA_API qoraGetValueChar(int handle, double varHandle, char* value, int valueLength) {

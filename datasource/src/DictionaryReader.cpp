@@ -65,10 +65,8 @@ class DictionaryReader {
     void CloseVariables();
     void ReadVariable();
     void ReadValueLabels();
-    QORA_VLMap LabelMap(const std::vector<std::pair<std::string, std::string>>& pairs,
-                        int type) const;
-    void AttachValueLabels(const std::vector<std::pair<std::string, std::string>>& pairs,
-                           const std::vector<int>& indexes);
+    QORA_VLMap LabelMap(int type) const;
+    void AttachValueLabels();
     void ReadDocuments();
     void ReadExtension();
 
@@ -78,6 +76,15 @@ class DictionaryReader {
     SlotDictionary fSlots;
     int64_t fFileSize = 0;
     bool fVariablesClosed = false;
+
+    // The variable or value label record being read, in buffers that the
+    // records of a large dictionary reuse rather than allocate each anew.
+    std::string fLabel;
+    std::vector<std::pair<std::string, std::string>> fPairs;
+    std::vector<int32> fLabelSlots;
+    std::vector<int> fIndexes;
+    // The maps by the cut of their values, which takes at most nine values.
+    std::vector<std::pair<int, QORA_VLMap>> fByCut;
 };
 
 void DictionaryReader::ReadExact(void* buffer, int64_t size, const char* condition) {
@@ -171,12 +178,11 @@ void DictionaryReader::ReadVariable() {
                          "QORA_Variable::IsValidMissingCode(code)");
     QORA_FILE_CHECK_TEXT(kErrBadFormat, type < 0 || fSource.HasRoomFor(type), "HasRoomFor(type)");
 
-    std::string label;
     int32 labelLen = 0;
     if (hasLabel != 0) {
         labelLen = ReadInt("len == sizeof(labelLen)");
         QORA_FILE_CHECK_TEXT(kErrBadFormat, labelLen >= 0, "labelLen >= 0");
-        ReadSized(label, 4 * ((int64_t(labelLen) + 3) / 4), "len == paddedLen");
+        ReadSized(fLabel, 4 * ((int64_t(labelLen) + 3) / 4), "len == paddedLen");
     }
     std::string missing;
     if (code != 0) ReadSized(missing, 8 * std::abs(code), "len == 8*abs(code)");
@@ -186,7 +192,7 @@ void DictionaryReader::ReadVariable() {
     var.SetName(rec.name, strnlen(rec.name, sizeof rec.name));
     var.SetPrintFormatWord(Int(rec.printFormat));
     var.SetWriteFormatWord(Int(rec.writeFormat));
-    if (hasLabel != 0) var.SetLabel(label.data(), size_t(labelLen));
+    if (hasLabel != 0) var.SetLabel(fLabel.data(), size_t(labelLen));
     if (code != 0) {
         if (type == 0 && fSettings.fSwapped)
             for (size_t at = 0; at < missing.size(); at += 8) SwapBytes(&missing[at], 8);
@@ -204,17 +210,14 @@ void DictionaryReader::ReadValueLabels() {
     const int32 nLabels = ReadInt("len == sizeof(nLabels)");
     // Each pair takes at least 16 bytes.
     QORA_FILE_CHECK_TEXT(kErrTooShort, nLabels <= Remaining() / 16, "len == header.size()");
-    std::vector<std::pair<std::string, std::string>> pairs;
-    pairs.reserve(size_t(std::max(nLabels, 0)));
-    for (int32 i = 0; i < nLabels; ++i) {
+    fPairs.resize(size_t(std::max(nLabels, 0)));
+    for (auto& [value, label] : fPairs) {
         unsigned char head[kStringValueSize + 1];
         ReadExact(head, sizeof head, "len == header.size()");
         const uint8_t m = head[kStringValueSize];
-        std::string label;
         ReadSized(label, ((m + 8) / 8) * 8 - 1, "len == paddedLen");
         label.resize(m);
-        pairs.emplace_back(std::string(reinterpret_cast<char*>(head), kStringValueSize),
-                           std::move(label));
+        value.assign(reinterpret_cast<char*>(head), kStringValueSize);
     }
 
     const int32 recType = ReadInt("len == 2*sizeof(int32)");
@@ -222,16 +225,15 @@ void DictionaryReader::ReadValueLabels() {
     QORA_FILE_CHECK_TEXT(kErrBadFormat, recType == kValueLabelVarsRecord, "h[0] == 4");
     QORA_FILE_CHECK_TEXT(kErrBadFormat, nVars > 0, "h[1] > 0");
     QORA_FILE_CHECK_TEXT(kErrTooShort, nVars <= Remaining() / 4, "len == nVars*sizeof(int32)");
-    std::vector<int32> slots(nVars);
-    ReadExact(slots.data(), int64_t(nVars) * 4, "len == nVars*sizeof(int32)");
-    std::vector<int> indexes;
-    indexes.reserve(slots.size());
-    for (int32 slot : slots) {
+    fLabelSlots.resize(size_t(nVars));
+    ReadExact(fLabelSlots.data(), int64_t(nVars) * 4, "len == nVars*sizeof(int32)");
+    fIndexes.clear();
+    for (int32 slot : fLabelSlots) {
         const int index = fSlots.IndexOfSlot(Int(slot));
         QORA_FILE_CHECK_TEXT(kErrBadFormat, index >= 0, "slots.IsValidSlot(slot)");
-        indexes.push_back(index);
+        fIndexes.push_back(index);
     }
-    AttachValueLabels(pairs, indexes);
+    AttachValueLabels();
 }
 
 // The first variable listed decides whether the values are numbers or
@@ -241,20 +243,20 @@ void DictionaryReader::ReadValueLabels() {
 // Variables of one width share one map; the maps of widths that cut the
 // values alike share their pairs, so that a record listing variables of
 // many widths costs its labels once.
-void DictionaryReader::AttachValueLabels(
-    const std::vector<std::pair<std::string, std::string>>& pairs,
-    const std::vector<int>& indexes) {
-    const bool numeric = fSource.GetVariable(indexes[0]).GetType() == 0;
-    std::map<int, QORA_VLMap> byType, byCut;
-    for (int index : indexes) {
+void DictionaryReader::AttachValueLabels() {
+    const bool numeric = fSource.GetVariable(fIndexes[0]).GetType() == 0;
+    std::map<int, QORA_VLMap> byType;
+    fByCut.clear();
+    for (int index : fIndexes) {
         QORA_Variable& var = fSource.GetVariable(index);
         const int type = var.GetType();
         if ((type == 0) != numeric) continue;
         auto found = byType.find(type);
         if (found == byType.end()) {
             const int cut = std::min<int>(type, kStringValueSize);
-            auto model = byCut.find(cut);
-            if (model == byCut.end()) model = byCut.emplace(cut, LabelMap(pairs, type)).first;
+            auto model = std::find_if(fByCut.begin(), fByCut.end(),
+                                      [cut](const auto& entry) { return entry.first == cut; });
+            if (model == fByCut.end()) model = fByCut.emplace(model, cut, LabelMap(type));
             // A model that already has the type goes to its variables as it is.
             QORA_VLMap map = model->second;
             if (map.KeyType() != type) map.SetKeyType(type);
@@ -262,14 +264,14 @@ void DictionaryReader::AttachValueLabels(
         }
         var.SetValueLabels(found->second);
     }
+    fByCut.clear();
 }
 
-QORA_VLMap DictionaryReader::LabelMap(const std::vector<std::pair<std::string, std::string>>& pairs,
-                                      int type) const {
+QORA_VLMap DictionaryReader::LabelMap(int type) const {
     QORA_VLMap map(type);
     std::vector<QORA_VLMapImpl::Pair> keyed;
-    keyed.reserve(pairs.size());
-    for (std::pair<std::string, std::string> pair : pairs) {
+    keyed.reserve(fPairs.size());
+    for (std::pair<std::string, std::string> pair : fPairs) {
         if (type == 0) {
             if (fSettings.fSwapped) SwapBytes(&pair.first[0], kStringValueSize);
         } else {

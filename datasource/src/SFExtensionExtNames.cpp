@@ -30,7 +30,8 @@ using NameList = std::vector<std::pair<std::string, std::string>>;
 class Renames {
   public:
     explicit Renames(const NameList& list) : fList(list), fFirst(list.size()) {
-        for (size_t i = 0; i < list.size(); ++i) fFirst.Insert(list[i].first, int32_t(i));
+        for (size_t i = 0; i < list.size(); ++i)
+            if (!fFirst.Insert(list[i].first, int32_t(i))) fRepeats = true;
     }
 
     // The second name for name; null when no entry has it first.
@@ -38,10 +39,19 @@ class Renames {
         const int32_t at = fFirst.Find(name);
         return at < 0 ? nullptr : &fList[size_t(at)].second;
     }
+    // Find for the name of the variable at position. A record lists the
+    // variables in their order, so the entry there is tried first, which
+    // spares a look-up in a table far larger than the cache.
+    const std::string* FindAt(size_t position, std::string_view name) const {
+        if (!fRepeats && position < fList.size() && fList[position].first == name)
+            return &fList[position].second;
+        return Find(name);
+    }
 
   private:
     const NameList& fList;
     NameTable fFirst;
+    bool fRepeats = false;  // some first name has two entries
 };
 
 // 0 -> A, 25 -> Z, 26 -> AA, 27 -> AB, ...
@@ -102,7 +112,7 @@ void RenameSetMembers(QORA_DataSource& source, const Renames& renames, bool expo
 void RenameVariables(QORA_DataSource& source, const Renames& renames) {
     for (int i = 0; i < source.ColumnCount(); ++i) {
         QORA_Variable& var = source.GetVariable(i);
-        if (const std::string* renamed = renames.Find(var.GetName()))
+        if (const std::string* renamed = renames.FindAt(size_t(i), var.GetName()))
             var.SetName(renamed->data(), renamed->size());
     }
 }

@@ -1,8 +1,7 @@
 #include "nametable.h"
 
+#include <algorithm>
 #include <functional>
-
-#include "dserror.h"
 
 namespace {
 
@@ -14,11 +13,18 @@ uint64_t Tag(uint64_t hash) { return hash >> 32 << 32; }
 
 }  // namespace
 
-NameTable::NameTable(size_t capacity) : fCapacity(capacity) {
+NameTable::NameTable(size_t capacity) { Resize(capacity); }
+
+void NameTable::Resize(size_t capacity) {
+    fCapacity = capacity;
     size_t slots = 2;
     while (slots < 2 * capacity) slots *= 2;
     fSlots.assign(slots, 0);
     fEntries.reserve(capacity);
+    for (size_t i = 0; i < fEntries.size(); ++i) {
+        const uint64_t hash = HashOf(fEntries[i].first);
+        fSlots[SlotOf(fEntries[i].first, hash)] = Tag(hash) | (i + 1);
+    }
 }
 
 size_t NameTable::SlotOf(std::string_view name, uint64_t hash) const {
@@ -31,10 +37,10 @@ size_t NameTable::SlotOf(std::string_view name, uint64_t hash) const {
 }
 
 bool NameTable::Insert(std::string_view name, int32_t value) {
+    if (fEntries.size() == fCapacity) Resize(std::max<size_t>(4, 2 * fCapacity));
     const uint64_t hash = HashOf(name);
     uint64_t& slot = fSlots[SlotOf(name, hash)];
     if (slot != 0) return false;
-    QORA_ASSERT(fEntries.size() < fCapacity);
     fEntries.emplace_back(name, value);
     slot = Tag(hash) | fEntries.size();
     return true;

@@ -13,7 +13,7 @@
 
 class NameTable {
   public:
-    // Room for capacity names.
+    // Room for capacity names; more make the table grow.
     explicit NameTable(size_t capacity);
 
     // Adds name with value unless the table has it already: false then.
@@ -24,6 +24,8 @@ class NameTable {
   private:
     // The slot that holds name, or the empty one where it would go.
     size_t SlotOf(std::string_view name, uint64_t hash) const;
+    // Makes room for capacity names and places the entries anew.
+    void Resize(size_t capacity);
 
     // The high half of a name's hash, and its entry + 1 (0: empty).
     std::vector<uint64_t> fSlots;

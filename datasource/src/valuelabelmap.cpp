@@ -10,6 +10,9 @@ namespace {
 
 const char kBlankUnit[] = "        ";
 
+// Up to this many pairs are sorted by insertion.
+enum : size_t { kFewPairs = 16 };
+
 // One 8-byte unit as stored: a little-endian double, whatever the host; a
 // unit past the end of the key is blank.
 double UnitValue(const std::string& key, size_t unit) {
@@ -107,23 +110,36 @@ void QORA_VLMapImpl::Insert(std::string key, std::string label) {
 }
 
 // A stable sort keeps equal keys in their order of arrival; the last of them
-// wins, as it would by replacing the label of the ones before.
+// wins, as it would by replacing the label of the ones before. The few
+// labels of most records are sorted by insertion, which needs no buffer as
+// the library's stable sort does, and merged in place: a large dictionary
+// holds many small maps.
 void QORA_VLMapImpl::InsertAll(std::vector<Pair> pairs) {
     pairs.insert(pairs.begin(), fPairs->begin(), fPairs->end());
     for (Pair& pair : pairs) pair.key = Trimmed(std::move(pair.key));
     const auto less = [](const Pair& a, const Pair& b) { return CompareKeys(a.key, b.key) < 0; };
-    std::stable_sort(pairs.begin(), pairs.end(), less);
-    std::vector<Pair> merged;
-    merged.reserve(pairs.size());
-    for (Pair& pair : pairs) {
-        if (!merged.empty() && merged.back().key == pair.key) {
-            merged.back().label = std::move(pair.label);
+    if (pairs.size() > kFewPairs) {
+        std::stable_sort(pairs.begin(), pairs.end(), less);
+    } else {
+        for (size_t i = 1; i < pairs.size(); ++i)
+            for (size_t j = i; j > 0 && less(pairs[j], pairs[j - 1]); --j)
+                std::swap(pairs[j], pairs[j - 1]);
+    }
+    size_t kept = 0;
+    for (size_t i = 0; i < pairs.size(); ++i) {
+        if (kept > 0 && pairs[kept - 1].key == pairs[i].key) {
+            pairs[kept - 1].label = std::move(pairs[i].label);
         } else {
-            merged.push_back(std::move(pair));
+            if (kept != i) pairs[kept] = std::move(pairs[i]);
+            ++kept;
         }
     }
-    merged.shrink_to_fit();
-    fPairs = std::make_shared<std::vector<Pair>>(std::move(merged));
+    pairs.erase(pairs.begin() + std::ptrdiff_t(kept), pairs.end());
+    pairs.shrink_to_fit();
+    if (fPairs.use_count() > 1)
+        fPairs = std::make_shared<std::vector<Pair>>(std::move(pairs));
+    else
+        *fPairs = std::move(pairs);
 }
 
 const std::string* QORA_VLMapImpl::Lookup(const std::string& key) const {

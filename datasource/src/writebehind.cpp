@@ -6,12 +6,25 @@
 
 bool WriteBehind::Put(int64_t at, const void* data, uint32_t count) {
     if (fLength > 0 && at != fStart + fLength && !Flush()) return false;
+    const auto* bytes = static_cast<const unsigned char*>(data);
+    // A piece that does not fit fills the collection up first: its whole
+    // stretches then go out and leave nothing behind, where writing them
+    // before the piece moved the rest of a stretch to the front every time.
+    if (fLength > 0 && count > kSize - fLength && count <= kSize) {
+        const uint32_t room = kSize - fLength;
+        std::memcpy(fBuffer.get() + fLength, bytes, room);
+        fLength = kSize;
+        bytes += room;
+        at += room;
+        count -= room;
+        if (!WriteWholeStretches()) return false;
+    }
     if (count > kSize - fLength && !WriteWholeStretches()) return false;
     if (count > kSize - fLength && !Flush()) return false;
-    if (count > kSize) return WriteAt(at, data, count);
+    if (count > kSize) return WriteAt(at, bytes, count);
     if (!fBuffer) fBuffer.reset(new unsigned char[kSize]);
     if (fLength == 0) fStart = at;
-    std::memcpy(fBuffer.get() + fLength, data, count);
+    std::memcpy(fBuffer.get() + fLength, bytes, count);
     fLength += count;
     return true;
 }
