@@ -499,11 +499,6 @@ SysFileBuilder& SysFileBuilder::Case(std::vector<Value> values) {
     return *this;
 }
 
-SysFileBuilder& SysFileBuilder::Data(Bytes bytes) {
-    fTrailing.insert(fTrailing.end(), bytes.begin(), bytes.end());
-    return *this;
-}
-
 void SysFileBuilder::AppendCase(std::vector<CaseUnit>& units, const std::vector<Value>& row) const {
     auto addText = [&units](const std::string& text) {
         for (size_t at = 0; at < text.size(); at += 8) {
@@ -552,11 +547,10 @@ namespace {
 // their own, everything else follows the control bytes raw.
 uint8_t CompressionCode(const std::array<uint8_t, 8>& bytes) {
     if (std::all_of(bytes.begin(), bytes.end(), [](uint8_t b) { return b == ' '; })) return 254;
-    double value;
-    std::memcpy(&value, bytes.data(), 8);
     uint64_t bits;
     std::memcpy(&bits, bytes.data(), 8);
     if (bits == 0xFFEFFFFFFFFFFFFFull) return 255;
+    const double value = FromBits(bits);
     const bool whole = std::trunc(value) == value && !(value == 0.0 && std::signbit(value));
     if (whole && value >= -99.0 && value <= 151.0) return uint8_t(value + 100.0);
     return 253;
@@ -585,16 +579,12 @@ Bytes SysFileBuilder::Compress(const std::vector<CaseUnit>& units) const {
 Bytes SysFileBuilder::CaseData() const {
     std::vector<CaseUnit> units;
     for (const auto& row : fCases) AppendCase(units, row);
+    if (fCompressed) return Compress(units);
     Bytes data;
-    if (fCompressed) {
-        data = Compress(units);
-    } else {
-        for (const CaseUnit& unit : units) {
-            Bytes raw = FileUnit(unit);
-            data.insert(data.end(), raw.begin(), raw.end());
-        }
+    for (const CaseUnit& unit : units) {
+        const Bytes raw = FileUnit(unit);
+        data.insert(data.end(), raw.begin(), raw.end());
     }
-    data.insert(data.end(), fTrailing.begin(), fTrailing.end());
     return data;
 }
 
@@ -620,21 +610,10 @@ Bytes SysFileBuilder::Unit(const Value& value) const {
     return out.bytes;
 }
 
-Bytes SysFileBuilder::Block(std::array<uint8_t, 8> codes, const std::vector<Value>& raws) const {
-    Bytes block(codes.begin(), codes.end());
-    for (const Value& raw : raws) {
-        Bytes unit = Unit(raw);
-        block.insert(block.end(), unit.begin(), unit.end());
-    }
-    return block;
-}
-
 Bytes SysFileBuilder::Build() const {
     Bytes file = HeaderBytes();
-    Bytes dictionary = Dictionary();
-    Bytes data = CaseData();
-    file.insert(file.end(), dictionary.begin(), dictionary.end());
-    file.insert(file.end(), data.begin(), data.end());
+    for (const Bytes& part : {Dictionary(), CaseData()})
+        file.insert(file.end(), part.begin(), part.end());
     return file;
 }
 
