@@ -60,20 +60,6 @@ OpenFailure FailureOf(const std::string& path) {
 
 OpenFailure FailureOf(const fixture::SysFileBuilder& b) { return FailureOf(b.WriteTemp()); }
 
-// A file with one of each kind of dictionary record.
-SysFileBuilder Full(Endian e) {
-    SysFileBuilder b(e);
-    b.Numeric("AGE").Label("Age").Missing({-1.0});
-    b.String("NAME", 20).Label("Name").MissingStrings({"x"});
-    b.Numeric("W").MissingRange(0.0, 1.0, 9.0);
-    b.ValueLabels({{1.0, "One"}, {2.0, "Two two two"}}, {1, 5});
-    b.Documents({"doc"});
-    b.IntegerInfo();
-    b.Extension(12, 4, {1, 2, 3, 4});
-    b.Case({1.0, "Ann", 2.0});
-    return b;
-}
-
 #define EXPECT_FAILS(source, num, cond)           \
     do {                                          \
         const OpenFailure f = FailureOf(source);  \
@@ -300,45 +286,38 @@ TEST_P(Reader, CaseCountFollowsItsMarkerAndOnlyRises) {
 // Every file has YEAR_, NAME (two units), MONTH_ and DATE_, for the date
 // variable information.
 TEST_P(Reader, MalformedRecordsFailTheOpen) {
-    auto file = [&] {
+    const SysFileBuilder e(GetParam());  // encodes the date information's numbers
+    auto ones = [](int32_t size, int32_t count) { return Bytes(size_t(size * count), 1); };
+    const std::tuple<int32_t, int32_t, Bytes, std::string> rows[] = {
+        {kIntegerInfoExtension, 4, ones(4, 7), "rec.NUnits() == 8"},
+        {kIntegerInfoExtension, 8, ones(8, 8), "rec.UnitSize() == 4"},
+        {kFloatInfoExtension, 4, ones(4, 3), "rec.UnitSize() == sizeof(double)"},
+        {kFloatInfoExtension, 8, ones(8, 4), "rec.NUnits() == 3"},
+        {kDisplayExtension, 8, ones(8, 6), "rec.UnitSize() == sizeof(int32)"},
+        {kDisplayExtension, 4, ones(4, 3), "rec.NUnits()== src.ColumnCount()*3"},
+        {kCaseCountExtension, 4, ones(4, 4), "rec.UnitSize() == sizeof(int64)"},
+        {kCaseCountExtension, 8, ones(8, 3), "rec.NUnits() == 1 || rec.NUnits() == 2"},
+        {kFileAttributesExtension, 2, ones(2, 4), "rec.UnitSize() == sizeof(char)"},
+        {kEncodingExtension, 2, ones(2, 3), "rec.UnitSize() == sizeof(char)"},
+        {kDateInfoExtension, 8, ones(8, 6), "rec.UnitSize() == 4"},
+        {kDateInfoExtension, 4, e.Int32s({0, 1, 11, 1, 1, 1}),
+         "0 <= nDateVars && nDateVars < QORA_TrendsInfo::eMaxDateVars"},
+        {kDateInfoExtension, 4, e.Int32s({0, 1, 4, 1, 1, 1, 1, 2, 1, 4, 4, 1, 0, 0, 0}),
+         "nElements >= 3*nDateVars+6"},
+        {kDateInfoExtension, 4, e.Int32s({0, 1, 0, 1, 1, 0, 0, 0, 0, 0, 0, 0}),
+         "nElements <= 3*nDateVars+9"},
+        {kDateInfoExtension, 4, e.Int32s({0, 1}), "nElements >= kFixedUnits"},
+        {kDateInfoExtension, 4, e.Int32s({0, 1, 1, 1, 1, 1, 6, 2, 1, 0, 0, 0}), "iVar < nVars"},
+        {kDateInfoExtension, 4, e.Int32s({0, 1, 1, 1, 1, 1, 1, 2, 1, 4, 4, 1}),
+         "iDateVar < nDateVars || iType == e_DATKEY || iType == e_NONE"},
+    };
+    for (const auto& [subtype, unitSize, contents, condition] : rows) {
         SysFileBuilder b(GetParam());
         b.Numeric("YEAR_");
         b.String("NAME", 12);
         b.Numeric("MONTH_");
         b.String("DATE_", 10);
-        return b;
-    };
-    const std::tuple<int32_t, int32_t, int32_t, std::string> rows[] = {
-        {kIntegerInfoExtension, 4, 7, "rec.NUnits() == 8"},
-        {kIntegerInfoExtension, 8, 8, "rec.UnitSize() == 4"},
-        {kFloatInfoExtension, 4, 3, "rec.UnitSize() == sizeof(double)"},
-        {kFloatInfoExtension, 8, 4, "rec.NUnits() == 3"},
-        {kDisplayExtension, 8, 6, "rec.UnitSize() == sizeof(int32)"},
-        {kDisplayExtension, 4, 3, "rec.NUnits()== src.ColumnCount()*3"},
-        {kCaseCountExtension, 4, 4, "rec.UnitSize() == sizeof(int64)"},
-        {kCaseCountExtension, 8, 3, "rec.NUnits() == 1 || rec.NUnits() == 2"},
-        {kFileAttributesExtension, 2, 4, "rec.UnitSize() == sizeof(char)"},
-        {kEncodingExtension, 2, 3, "rec.UnitSize() == sizeof(char)"},
-        {kDateInfoExtension, 8, 6, "rec.UnitSize() == 4"},
-    };
-    for (const auto& [subtype, unitSize, nUnits, condition] : rows) {
-        SysFileBuilder b = file();
-        b.Extension(subtype, unitSize, Bytes(size_t(unitSize * nUnits), 1));
-        EXPECT_FAILS(b, kErrBadFormat, condition);
-    }
-    const std::pair<std::vector<int32_t>, std::string> dates[] = {
-        {{0, 1, 11, 1, 1, 1}, "0 <= nDateVars && nDateVars < QORA_TrendsInfo::eMaxDateVars"},
-        {{0, 1, 4, 1, 1, 1, 1, 2, 1, 4, 4, 1, 0, 0, 0}, "nElements >= 3*nDateVars+6"},
-        {{0, 1, 0, 1, 1, 0, 0, 0, 0, 0, 0, 0}, "nElements <= 3*nDateVars+9"},
-        {{0, 1}, "nElements >= kFixedUnits"},
-        {{0, 1, 1, 1, 1, 1, 6, 2, 1, 0, 0, 0}, "iVar < nVars"},
-        {{0, 1, 1, 1, 1, 1, 1, 2, 1, 4, 4, 1},
-         "iDateVar < nDateVars || iType == e_DATKEY || iType == e_NONE"},
-    };
-    for (const auto& [units, condition] : dates) {
-        SysFileBuilder b = file();
-        b.DateInfo(units);
-        EXPECT_FAILS(b, kErrBadFormat, condition);
+        EXPECT_FAILS(b.Extension(subtype, unitSize, contents), kErrBadFormat, condition);
     }
     // A frame without units, which the reader refuses before any handler sees it.
     SystemFileDataSource source;
@@ -346,20 +325,19 @@ TEST_P(Reader, MalformedRecordsFailTheOpen) {
                  SystemFileException);
 }
 
-TEST_P(Reader, HeaderFaults) {
-    SysFileBuilder b(GetParam());
-    EXPECT_FAILS(b.WriteTemp(Bytes{}, "empty.qsf"), kErrTooShort, "nRead == 4");
-    EXPECT_FAILS(b.WriteTemp(Bytes{'$', 'F', 'L'}, "three.qsf"), kErrTooShort, "nRead == 4");
-    EXPECT_FAILS(b.WriteTemp(Truncated(b.Build(), 100), "short.qsf"), kErrTooShort,
-                 "nRead == len1");
-    b.header().magic = "$FL3";
-    EXPECT_FAILS(b, kErrBadFormat, "std::string(magic) == \"$FL2\"");
-    EXPECT_NE(FailureOf(b).text.find("1204"), std::string::npos);
-}
-
-// Each kind of record malformed or cut short, and records out of place.
+// The header and each kind of record malformed or cut short, and records out
+// of place.
 TEST_P(Reader, RecordFaults) {
     using B = SysFileBuilder;
+    SysFileBuilder h(GetParam());
+    EXPECT_FAILS(h.WriteTemp(Bytes{}, "empty.qsf"), kErrTooShort, "nRead == 4");
+    EXPECT_FAILS(h.WriteTemp(Bytes{'$', 'F', 'L'}, "three.qsf"), kErrTooShort, "nRead == 4");
+    EXPECT_FAILS(h.WriteTemp(Truncated(h.Build(), 100), "short.qsf"), kErrTooShort,
+                 "nRead == len1");
+    h.header().magic = "$FL3";
+    EXPECT_FAILS(h, kErrBadFormat, "std::string(magic) == \"$FL2\"");
+    EXPECT_NE(FailureOf(h).text.find("1204"), std::string::npos);
+
     SysFileBuilder b(GetParam());
     b.Numeric("X");
     b.EndRecord(false);
@@ -430,30 +408,32 @@ TEST_P(Reader, RecordFaults) {
     frame(65536, 65536, {}, kErrTooShort, "len == h[2]*h[1]");
 }
 
-// Every cut inside the dictionary fails cleanly; after it the open succeeds.
-TEST_P(Reader, EveryTruncationFailsCleanly) {
-    const SysFileBuilder b = Full(GetParam());
+// Every cut inside the dictionary fails cleanly, after it the open succeeds;
+// any single corrupted byte opens or fails with a format error, nothing else.
+TEST_P(Reader, EveryTruncationAndCorruptionStaysWithinTheChecks) {
+    SysFileBuilder b(GetParam());  // one of each kind of dictionary record
+    b.Numeric("AGE").Label("Age").Missing({-1.0});
+    b.String("NAME", 20).Label("Name").MissingStrings({"x"});
+    b.Numeric("W").MissingRange(0.0, 1.0, 9.0);
+    b.ValueLabels({{1.0, "One"}, {2.0, "Two two two"}}, {1, 5});
+    b.Documents({"doc"});
+    b.IntegerInfo();
+    b.Extension(12, 4, {1, 2, 3, 4});
+    b.Case({1.0, "Ann", 2.0});
     const Bytes whole = b.Build();
-    const size_t dataStart = b.DataStart();
-    for (size_t size = 0; size < whole.size(); ++size) {
-        const OpenFailure f = FailureOf(b.WriteTemp(Truncated(whole, size), "cut.qsf"));
-        if (size < dataStart)
-            EXPECT_TRUE(f.number == kErrTooShort || f.number == kErrBadFormat) << size << f.text;
-        else
-            EXPECT_EQ(f.number, 0) << size << ": " << f.text;
-    }
-}
-
-// Any single corrupted byte opens or fails with a format error; nothing else.
-TEST_P(Reader, CorruptedBytesNeverEscapeTheChecks) {
-    const SysFileBuilder b = Full(GetParam());
-    const Bytes whole = b.Build();
-    for (size_t at = 0; at < b.DataStart(); ++at) {
+    for (size_t at = 0; at < whole.size(); ++at) {
+        SCOPED_TRACE(at);
+        const OpenFailure cut = FailureOf(b.WriteTemp(Truncated(whole, at), "cut.qsf"));
+        if (at >= b.DataStart()) {
+            EXPECT_EQ(cut.number, 0) << cut.text;
+            continue;
+        }
+        EXPECT_TRUE(cut.number == kErrTooShort || cut.number == kErrBadFormat) << cut.text;
         Bytes bytes = whole;
         bytes[at] = at % 2 ? 0x80 : 0xFF;  // a sign bit or a huge count
         const OpenFailure f = FailureOf(b.WriteTemp(bytes, "bad.qsf"));
         EXPECT_TRUE(f.number == 0 || f.number == kErrTooShort || f.number == kErrBadFormat)
-            << at << ": " << f.text;
+            << f.text;
     }
 }
 

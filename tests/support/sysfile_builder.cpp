@@ -97,8 +97,6 @@ uint32_t StringFormat(int width) {
     return (1u << 16) | (uint32_t(width & 0xFF) << 8) | uint32_t(width >> 8 & 0xFF);
 }
 
-// ---------------------------------------------------------------- TempDir
-
 TempDir::TempDir() {
     std::string test = "outside-test";
     if (const auto* info = ::testing::UnitTest::GetInstance()->current_test_info())
@@ -123,8 +121,6 @@ void Patch(Bytes& bytes, size_t offset, const Bytes& with) {
     if (offset + with.size() > bytes.size()) throw std::out_of_range("patch past the end");
     std::copy(with.begin(), with.end(), bytes.begin() + offset);
 }
-
-// ---------------------------------------------------------------- Var
 
 Var::Var(std::string name, int width, int slot)
     : fName(std::move(name)), fWidth(width), fSlot(slot) {}
@@ -185,8 +181,6 @@ Var& Var::Continuations(int count) {
     fContinuations = count;
     return *this;
 }
-
-// ---------------------------------------------------------------- header and dictionary
 
 SysFileBuilder::SysFileBuilder(Endian endian) : fEndian(endian) {}
 
@@ -440,9 +434,8 @@ SysFileBuilder& SysFileBuilder::RawRecord(Bytes bytes) {
     return *this;
 }
 
-SysFileBuilder& SysFileBuilder::EndRecord(bool write, int32_t filler) {
+SysFileBuilder& SysFileBuilder::EndRecord(bool write) {
     fWriteEnd = write;
-    fEndFiller = filler;
     return *this;
 }
 
@@ -485,12 +478,10 @@ Bytes SysFileBuilder::Dictionary() const {
     }
     if (fWriteEnd) {
         out.I32(999);
-        out.I32(fEndFiller);
+        out.I32(0);
     }
     return out.bytes;
 }
-
-// ---------------------------------------------------------------- case data
 
 SysFileBuilder& SysFileBuilder::Case(std::vector<Value> values) {
     if (values.size() != fVars.size())
@@ -588,8 +579,6 @@ Bytes SysFileBuilder::CaseData() const {
     return data;
 }
 
-// ---------------------------------------------------------------- encoders and output
-
 Bytes SysFileBuilder::Int32(int32_t value) const { return Int32s({value}); }
 
 Bytes SysFileBuilder::Int32s(const std::vector<int32_t>& values) const {
@@ -631,8 +620,6 @@ std::string SysFileBuilder::WriteTemp(const Bytes& bytes, const std::string& fil
     if (!file.flush()) throw std::runtime_error("cannot write " + path);
     return path;
 }
-
-// ---------------------------------------------------------------- record texts
 
 std::string SysFileBuilder::AttributeText(
     const std::vector<std::pair<std::string, std::vector<std::string>>>& attributes) {

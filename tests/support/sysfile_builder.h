@@ -212,8 +212,8 @@ class SysFileBuilder {
 
     // Bytes placed as they are among the dictionary records.
     SysFileBuilder& RawRecord(Bytes bytes);
-    // Whether the type 999 record is written, and its filler.
-    SysFileBuilder& EndRecord(bool write, int32_t filler = 0);
+    // Whether the type 999 record is written.
+    SysFileBuilder& EndRecord(bool write);
 
     // Case data. One value per variable; numbers for numeric variables,
     // strings for string variables (a mismatch is written as given).
@@ -269,7 +269,6 @@ class SysFileBuilder {
     Header fHeader;
     bool fCompressed = false;
     bool fWriteEnd = true;
-    int32_t fEndFiller = 0;
     std::deque<Var> fVars;
     std::vector<Record> fRecords;
     std::vector<std::vector<Value>> fCases;
