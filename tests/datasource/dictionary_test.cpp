@@ -15,14 +15,13 @@
 #include <tuple>
 
 #include "Attributes.h"
-#include "datasrc.h"
+#include "dictionary_source.h"
 #include "dserror.h"
 #include "qoramb.h"
 #include "specialvalues.h"
 #include "sysfile_builder.h"
 #include "valuelabelmap.h"
 #include "variable.h"
-#include "variableset.h"
 
 using fixture::FromBits;
 
@@ -30,25 +29,11 @@ namespace {
 
 using Set = QORA_VariableSet;
 
-class DictionaryOnly : public QORA_DataSource {
-  public:
-    QORA_InputCaseIterator* NewIterator(void*) override { return nullptr; }
-};
-
 Set VariableSet(const char* name, std::initializer_list<const char*> variables) {
     Set set(Set::kVariableSet);
     set.SetName(name);
     for (const char* v : variables) set.AddVariable(v);
     return set;
-}
-
-// Every field of a set on one line: category|name|value|label|flags|variables.
-std::string Describe(const Set& set) {
-    std::string text = std::to_string(set.GetCategory()) + "|" + set.GetName() + "|" +
-                       set.GetValue() + "|" + set.GetLabel() + "|" +
-                       std::to_string(set.GetFlags()) + "|";
-    for (const std::string& v : set.GetVariables()) text += v + " ";
-    return text;
 }
 
 std::string Parsed(std::string_view line) {
@@ -121,11 +106,7 @@ TEST(VariableSetLine, LinesGiveTheirFieldsOrNothing) {
 
 TEST(VariableSetPrune, RemovesUnknownNamesThenEmptySets) {
     DictionaryOnly source;
-    for (const std::string& name : {std::string("age"), std::string(64, 'L')}) {
-        QORA_Variable var(0);
-        var.SetName(name.c_str());
-        source.AppendVariable(var);
-    }
+    for (const std::string& name : {std::string("age"), std::string(64, 'L')}) source.Add(0, name);
     const std::string longName = std::string(64, 'l') + "tail";  // matched on 64 bytes
     QORA_VariableSetList sets = {VariableSet("keep", {"AGE", "gone", longName.c_str()}),
                                  VariableSet("empty", {"nothing"}), VariableSet("whole", {"Age"})};

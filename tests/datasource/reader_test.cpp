@@ -19,11 +19,10 @@
 #include "HeaderSettings.h"
 #include "SystemFileDataSource.h"
 #include "SystemFileExtensionRecord.h"
-#include "datasrc.h"
+#include "dictionary_source.h"
 #include "dserror.h"
 #include "encoding_scope.h"
 #include "sysfile_builder.h"
-#include "variableset.h"
 
 using namespace fixture;
 using namespace std::string_literals;
@@ -237,12 +236,9 @@ TEST_P(Reader, SetsLoseMembersTheFileDoesNotHave) {
     auto source = OpenFixture(b);
     std::string found;
     for (auto family : {QORA_SetFamily::kMultipleResponse, QORA_SetFamily::kVariableSets})
-        for (const QORA_VariableSet& set : LoadVariableSets(*source, family)) {
-            found += set.GetName() + "|" + set.GetValue() + "|" + set.GetLabel() + "|" +
-                     std::to_string(set.GetFlags()) + "|";
-            for (const std::string& v : set.GetVariables()) found += v + " ";
-        }
-    EXPECT_EQ(found, "$ab||Set|0|a B $b|1||0|A $C|10|CC|1|A B Group|||0|A B ");
+        for (const QORA_VariableSet& set : LoadVariableSets(*source, family))
+            found += Describe(set) + "; ";
+    EXPECT_EQ(found, "1|$ab||Set|0|a B ; 2|$b|1||0|A ; 2|$C|10|CC|1|A B ; 0|Group|||0|A B ; ");
 }
 
 // Display values out of range, attributes that do not parse or name nobody.
@@ -437,32 +433,17 @@ TEST_P(Reader, EveryTruncationAndCorruptionStaysWithinTheChecks) {
     }
 }
 
-namespace {
-
-// A dictionary without cases.
-class MemorySource : public QORA_DataSource {
-  public:
-    QORA_InputCaseIterator* NewIterator(void*) override { return nullptr; }
-    int Add(int type, const char* name) {
-        QORA_Variable var(type);
-        var.SetName(name);
-        return AppendVariable(var);
-    }
-};
-
-}  // namespace
-
 // Exported as a writer does (14, 13), then imported as a reader does (13, 14)
 // into the dictionary the file holds: names, segments and sets come back whole.
 TEST(LongNamesRecords, ExportedBytesMatchTheFixtureAndReadBackWhole) {
-    MemorySource original;
+    DictionaryOnly original;
     original.Add(0, "age");
     original.Add(0, "Income");
     original.GetVariable(original.Add(600, "Remarks")).SetLabel("Free text");
     const std::string set = "things= Income Remarks\n";
     original.SetExtensionContent(kVariableSetExtension, 1, int32_t(set.size()), set.data());
 
-    MemorySource written(original);
+    DictionaryOnly written(original);
     HeaderSettings out;
     const std::string strings = Export(kVeryLongStringsExtension, written, out);
     const std::string names = Export(kLongNamesExtension, written, out);
@@ -473,7 +454,7 @@ TEST(LongNamesRecords, ExportedBytesMatchTheFixtureAndReadBackWhole) {
     EXPECT_EQ(written.GetExtension(kVariableSetExtension).Impl()->Content(),
               "things= INCOME REMARKS\n");
 
-    MemorySource read(written);
+    DictionaryOnly read(written);
     HeaderSettings in;
     Import(kLongNamesExtension, read, in, names);
     Import(kVeryLongStringsExtension, read, in, strings);
