@@ -15,9 +15,9 @@
 #include <tuple>
 
 #include "Attributes.h"
+#include "api_handles.h"
 #include "dictionary_source.h"
 #include "dserror.h"
-#include "qoramb.h"
 #include "specialvalues.h"
 #include "sysfile_builder.h"
 #include "valuelabelmap.h"
@@ -41,19 +41,6 @@ std::string Parsed(std::string_view line) {
     return set ? Describe(*set) : "nothing";
 }
 
-// The layout must equal the one recomputed from the variables' widths.
-void ExpectExactLayout(const QORA_DataSource& ds) {
-    const CaseLayout& layout = ds.Layout();
-    int32_t offset = 0;
-    for (int i = 0; i < ds.ColumnCount(); ++i) {
-        EXPECT_EQ(layout.Offset(i), offset) << "variable " << i;
-        offset += ds.GetVariable(i).ValueUnits();
-    }
-    EXPECT_EQ(layout.Total(), offset);
-    const int n = ds.ColumnCount();
-    EXPECT_EQ(layout.LastSize(), n ? ds.GetVariable(n - 1).ValueUnits() : 0);
-}
-
 bool Parse(Attributes& target, const std::string& text, size_t* pos = nullptr) {
     return target.FromText(text.data(), text.size(), pos);
 }
@@ -71,7 +58,16 @@ TEST(DataSourceTest, DeletesKeepTheLayoutExact) {
     for (auto [first, last, splitCount] : deletes) {
         SCOPED_TRACE(first);
         ds.DeleteVariables(first, last);
-        ExpectExactLayout(ds);
+        // The layout must equal the one recomputed from the variables' widths.
+        const CaseLayout& layout = ds.Layout();
+        int32_t offset = 0;
+        for (int i = 0; i < ds.ColumnCount(); ++i) {
+            EXPECT_EQ(layout.Offset(i), offset) << "variable " << i;
+            offset += ds.GetVariable(i).ValueUnits();
+        }
+        EXPECT_EQ(layout.Total(), offset);
+        const int n = ds.ColumnCount();
+        EXPECT_EQ(layout.LastSize(), n ? ds.GetVariable(n - 1).ValueUnits() : 0);
         EXPECT_EQ(ds.SplitVarCount(), splitCount);
         EXPECT_EQ(ds.IsSplitSorted(), splitCount > 0);
     }
@@ -263,8 +259,7 @@ TEST(AttributesTest, MangledTextNeverReadsOutside) {
 }
 
 TEST(AttributesTest, MultibyteNamesInUtf8Mode) {
-    const int saved = mbIsUtf8Mode();
-    mbSetUtf8Mode(1);
+    fixture::Utf8Mode utf8;
     auto check = [](const std::string& s) { return Attributes::CheckName(s.data(), s.size()); };
     EXPECT_EQ(check("\xc3\xa9t\xc3\xa9"), 0);
     EXPECT_EQ(check("a\xc3"), 4);  // a character cut short
@@ -273,5 +268,4 @@ TEST(AttributesTest, MultibyteNamesInUtf8Mode) {
     EXPECT_TRUE(Parse(a, "\xc3\xa9t\xc3\xa9('1'\n)a\xc3('2'\n)"));
     EXPECT_EQ(a.Size(), 1);
     EXPECT_EQ(a.IndexOf("\xc3\x89T\xc3\x89"), 0);  // case ignored beyond ASCII
-    mbSetUtf8Mode(saved);
 }

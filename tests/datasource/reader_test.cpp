@@ -66,19 +66,6 @@ OpenFailure FailureOf(const fixture::SysFileBuilder& b) { return FailureOf(b.Wri
         EXPECT_EQ(f.condition, (cond)) << f.text; \
     } while (0)
 
-std::string Export(int32_t subtype, QORA_DataSource& source, HeaderSettings& settings) {
-    SystemFileExtensionRecord record;
-    FindExtensionHandler(subtype)->Export(source, settings, record);
-    return record.Text();
-}
-
-void Import(int32_t subtype, QORA_DataSource& source, HeaderSettings& settings,
-            const std::string& text) {
-    SystemFileExtensionRecord record;
-    record.SetText(text);
-    FindExtensionHandler(subtype)->Import(source, settings, record);
-}
-
 // The contents of the only record of a builder without variables.
 std::string Contents(const SysFileBuilder& b) {
     const fixture::Bytes file = b.Build();
@@ -445,19 +432,20 @@ TEST(LongNamesRecords, ExportedBytesMatchTheFixtureAndReadBackWhole) {
 
     DictionaryOnly written(original);
     HeaderSettings out;
-    const std::string strings = Export(kVeryLongStringsExtension, written, out);
-    const std::string names = Export(kLongNamesExtension, written, out);
-    EXPECT_EQ(strings, std::string("REMARKS=600\0\t", 13));
-    EXPECT_EQ(names, Contents(SysFileBuilder().LongNames(
-                         {{"AGE", "age"}, {"INCOME", "Income"}, {"REMARKS", "Remarks"}})));
+    SystemFileExtensionRecord strings, names;
+    FindExtensionHandler(kVeryLongStringsExtension)->Export(written, out, strings);
+    FindExtensionHandler(kLongNamesExtension)->Export(written, out, names);
+    EXPECT_EQ(strings.Text(), std::string("REMARKS=600\0\t", 13));
+    EXPECT_EQ(names.Text(), Contents(SysFileBuilder().LongNames(
+                                {{"AGE", "age"}, {"INCOME", "Income"}, {"REMARKS", "Remarks"}})));
     EXPECT_EQ(out.fVeryLongStrings, (std::vector<std::pair<int, int>>{{2, 600}}));
     EXPECT_EQ(written.GetExtension(kVariableSetExtension).Impl()->Content(),
               "things= INCOME REMARKS\n");
 
     DictionaryOnly read(written);
     HeaderSettings in;
-    Import(kLongNamesExtension, read, in, names);
-    Import(kVeryLongStringsExtension, read, in, strings);
+    FindExtensionHandler(kLongNamesExtension)->Import(read, in, names);
+    FindExtensionHandler(kVeryLongStringsExtension)->Import(read, in, strings);
     ASSERT_EQ(read.ColumnCount(), original.ColumnCount());
     for (int i = 0; i < read.ColumnCount(); ++i)
         EXPECT_TRUE(read.GetVariable(i) == original.GetVariable(i))
