@@ -1,13 +1,17 @@
 // Whole write, append, copy and read sessions through the exported calls,
 // with the Nth call to the device failing, for every N the session reaches:
 // the failure is reported, nothing crashes or leaks, an append that failed
-// keeps the cases that were there, and no file claims cases it lacks.
+// keeps the cases that were there, and no file claims cases it lacks. Then
+// the same sessions in several threads at once (run under ThreadSanitizer by
+// `make tsan`).
 #include <gtest/gtest.h>
 
 #include <cerrno>
 #include <cstring>
 #include <functional>
 #include <string>
+#include <thread>
+#include <vector>
 
 #include "api_handles.h"
 #include "qorafile.h"
@@ -20,7 +24,13 @@ namespace {
 constexpr int kBefore = 41;
 constexpr int kAdded = 300;  // cases a session writes: several buffers' worth
 
-std::string Text(int i) { return "case " + std::to_string(i) + std::string(size_t(i % 20), '*'); }
+// Values of their own in every thread, so that no case can pass for another's.
+thread_local int tThread = 0;
+double Number(int i) { return tThread * 1000 + i * 0.25; }
+std::string Text(int i) {
+    return std::to_string(tThread) + " case " + std::to_string(i) +
+           std::string(size_t(i % 20), '*');
+}
 
 // Defines the dictionary unless it came from another file; false on any failure.
 bool Define(int h, bool compressed) {
@@ -35,7 +45,7 @@ bool WriteCases(int h, int from, int count) {
     bool ok = true;
     for (int i = from; i < from + count; ++i) {
         char record[48];
-        const double number = i * 0.25;
+        const double number = Number(i);
         std::memcpy(record, &number, 8);
         std::memcpy(record + 8, (Text(i) + std::string(40, ' ')).data(), 40);
         ok = (i % 2 ? qoraWholeCaseOut(h, record) == 0
@@ -61,7 +71,7 @@ int ReadBack(const std::string& path, int& claimed) {
         char text[41] = {};
         EXPECT_EQ(qoraGetValueNumeric(h, 1.0, &number), 0);
         EXPECT_EQ(qoraGetValueChar(h, 2.0, text, sizeof text), 0);
-        EXPECT_EQ(number, read * 0.25) << path << " case " << read;
+        EXPECT_EQ(number, Number(read)) << path << " case " << read;
         EXPECT_EQ(std::string(text).substr(0, Text(read).size()), Text(read)) << read;
     }
     qoraCloseRead(h);
@@ -171,6 +181,29 @@ TEST(FaultSweep, EveryFailingDeviceCallIsReportedAndLosesNothingWritten) {
             }
         }
     }
+}
+
+// Each thread appends to a file of its own and reads it back, while the
+// process-wide tables serve every thread.
+TEST(Threads, EachThreadWritesAppendsAndReadsItsOwnFiles) {
+    std::vector<std::thread> threads;
+    for (int t = 1; t <= 4; ++t) {
+        threads.emplace_back([t] {
+            tThread = t;
+            for (bool compressed : {false, true, false}) {
+                const fixture::TempDir dir;
+                const Session append = Sessions(compressed)[1];  // "append"
+                append.prepare(dir.Path());
+                EXPECT_TRUE(append.run(dir.Path())) << "thread " << t;
+                int claimed = -1;
+                EXPECT_EQ(ReadBack(dir.Path() + "/out.qsf", claimed), append.allCases);
+                EXPECT_EQ(claimed, append.allCases);
+                double date = 0;
+                EXPECT_EQ(qoraConvertDate(6, 12, 2026, &date), QORA_STATUS_OK);
+            }
+        });
+    }
+    for (std::thread& thread : threads) thread.join();
 }
 
 }  // namespace

@@ -2,7 +2,6 @@
 // getters and the handed-out arrays on write handles and read files.
 #include <gtest/gtest.h>
 
-#include <cstring>
 #include <string>
 #include <tuple>
 #include <vector>
@@ -34,6 +33,18 @@ class ValueLabels : public ::testing::Test {
         const int status = qoraGetVarCValueLabel(h(), var, value, label);
         return std::to_string(status) + "|" + label;
     }
+    // The labels of a numeric variable as the array getter hands them out.
+    std::string NLabels(const char* var) {
+        double* values = nullptr;
+        char** labels = nullptr;
+        int count = 0;
+        std::string listed =
+            std::to_string(qoraGetVarNValueLabels(h(), var, &values, &labels, &count));
+        for (int i = 0; i < count; ++i)
+            listed += "|" + std::to_string(int(values[i])) + "=" + labels[i];
+        EXPECT_EQ(qoraFreeVarNValueLabels(values, labels, count), QORA_STATUS_OK);
+        return listed;
+    }
 
     fixture::TempDir fDir;
     OpenHandle fHandle;
@@ -51,19 +62,33 @@ TEST_F(ValueLabels, SingleLabelsMergeAndLookupsTellNoLabelsFromNoLabel) {
     EXPECT_EQ(NLabel("n2", 1.0), "-8|");
 }
 
-TEST_F(ValueLabels, KindAndNameChecks) {
-    EXPECT_EQ(qoraSetVarNValueLabel(h(), "s8", 1.0, "x"), QORA_STATUS_NUMERIC_REQUIRED);
-    EXPECT_EQ(qoraSetVarCValueLabel(h(), "n1", "a", "x"), QORA_STATUS_STRING_REQUIRED);
-    EXPECT_EQ(qoraSetVarNValueLabel(h(), "zz", 1.0, "x"), QORA_STATUS_VAR_NOT_FOUND);
-    EXPECT_EQ(qoraSetVarCValueLabel(h(), nullptr, "a", "x"), QORA_STATUS_VAR_NOT_FOUND);
-    EXPECT_EQ(NLabel("s8", 1.0), "14|");
-    EXPECT_EQ(CLabel("n1", "a"), "15|");
-    EXPECT_EQ(CLabel("zz", "a"), "12|");
+// Failed calls name the fault, clear their outputs and change nothing.
+TEST_F(ValueLabels, Statuses) {
+    double* values = reinterpret_cast<double*>(this);
+    char** labels = reinterpret_cast<char**>(this);
+    char** strings = labels;
+    int count = 7;
     char label[8];
-    EXPECT_EQ(qoraGetVarNValueLabelLong(h(), "n1", 1.0, label, 0, nullptr),
-              QORA_STATUS_BAD_FILE_HANDLE);
-    EXPECT_EQ(qoraGetVarNValueLabel(h(), "n1", 1.0, nullptr), QORA_STATUS_BAD_FILE_HANDLE);
-    EXPECT_EQ(qoraGetVarNValueLabel(-1, "n1", 1.0, label), QORA_STATUS_BAD_FILE_HANDLE);
+    const struct {
+        int status, expected;
+    } rows[] = {
+        {qoraSetVarNValueLabel(h(), "s8", 1.0, "x"), QORA_STATUS_NUMERIC_REQUIRED},
+        {qoraSetVarCValueLabel(h(), "n1", "a", "x"), QORA_STATUS_STRING_REQUIRED},
+        {qoraSetVarNValueLabel(h(), "zz", 1.0, "x"), QORA_STATUS_VAR_NOT_FOUND},
+        {qoraSetVarCValueLabel(h(), nullptr, "a", "x"), QORA_STATUS_VAR_NOT_FOUND},
+        {qoraGetVarNValueLabelLong(h(), "n1", 1.0, label, 0, nullptr), QORA_STATUS_BAD_FILE_HANDLE},
+        {qoraGetVarNValueLabel(h(), "n1", 1.0, nullptr), QORA_STATUS_BAD_FILE_HANDLE},
+        {qoraGetVarNValueLabel(-1, "n1", 1.0, label), QORA_STATUS_BAD_FILE_HANDLE},
+        {qoraGetVarNValueLabels(h(), "n1", &values, &labels, &count), QORA_WARN_NO_LABELS},
+        {values == nullptr && labels == nullptr && count == 0, 1},
+        {qoraGetVarCValueLabels(h(), "n1", &strings, &labels, &count), QORA_STATUS_STRING_REQUIRED},
+        {qoraGetVarNValueLabels(h(), "n1", nullptr, &labels, &count), QORA_STATUS_BAD_FILE_HANDLE},
+        {qoraFreeVarNValueLabels(nullptr, nullptr, 5), QORA_STATUS_OK},
+        {qoraFreeVarCValueLabels(nullptr, nullptr, 5), QORA_STATUS_OK},
+    };
+    for (size_t i = 0; i < std::size(rows); ++i)
+        EXPECT_EQ(rows[i].status, rows[i].expected) << "row " << i;
+    EXPECT_EQ(NLabel("s8", 1.0) + CLabel("n1", "a") + CLabel("zz", "a"), "14|15|12|");
 }
 
 // Stored labels keep 120 bytes, the short getters hand out 60, cut at whole
@@ -71,17 +96,14 @@ TEST_F(ValueLabels, KindAndNameChecks) {
 TEST_F(ValueLabels, LongLabelsAreStoredCutWithAWarning) {
     EXPECT_EQ(qoraSetVarNValueLabel(h(), "n1", 1.0, std::string(130, 'x').c_str()),
               QORA_WARN_VALUE_LABEL_TRUNCATED);
-    char label[200];
-    int length = 0;
-    ASSERT_EQ(qoraGetVarNValueLabelLong(h(), "n1", 1.0, label, sizeof label, &length),
-              QORA_STATUS_OK);
-    EXPECT_EQ(length, 120);
+    EXPECT_EQ(NLabels("n1"), "0|1=" + std::string(120, 'x'));
     EXPECT_EQ(NLabel("n1", 1.0), "0|" + std::string(60, 'x'));
     ASSERT_EQ(qoraSetVarCValueLabel(h(), "s8", "a", std::string(100, 'y').c_str()), QORA_STATUS_OK);
     EXPECT_EQ(CLabel("s8", "a"), "0|" + std::string(60, 'y'));
+    char label[200];
+    int length = 0;
     ASSERT_EQ(qoraGetVarCValueLabelLong(h(), "s8", "a", label, 6, &length), QORA_STATUS_OK);
-    EXPECT_STREQ(label, "yyyyy");
-    EXPECT_EQ(length, 5);
+    EXPECT_EQ(label + std::to_string(length), "yyyyy5");
 
     fixture::Utf8Mode utf8;
     std::string euros = "a";
@@ -90,8 +112,7 @@ TEST_F(ValueLabels, LongLabelsAreStoredCutWithAWarning) {
               QORA_WARN_VALUE_LABEL_TRUNCATED);
     ASSERT_EQ(qoraGetVarNValueLabelLong(h(), "n1", 1.0, label, sizeof label, &length),
               QORA_STATUS_OK);
-    EXPECT_EQ(label, euros.substr(0, 118));
-    EXPECT_EQ(length, 118);
+    EXPECT_EQ(label + std::to_string(length), euros.substr(0, 118) + "118");
     EXPECT_EQ(NLabel("n1", 1.0), "0|" + euros.substr(0, 58));
     // A 9-byte string value cut at the width of 8 keeps whole characters too.
     ASSERT_EQ(qoraSetVarCValueLabel(h(), "s8", "abc\xE2\x82\xAC\xE2\x82\xAC", "cut"),
@@ -118,74 +139,46 @@ TEST_F(ValueLabels, StringValuesArePaddedAndCutAtTheWidth) {
     }
 }
 
+// The set forms replace every named variable's labels; the first failing
+// variable stops the call before anything changes; strings need one width.
 TEST_F(ValueLabels, SetFormsReplaceEveryNamedVariablesLabels) {
     ASSERT_EQ(qoraSetVarNValueLabel(h(), "n1", 9.0, "old"), QORA_STATUS_OK);
     const char* vars[] = {"n1", "N2"};
     const double values[] = {1.0, 2.0};
     const char* labels[] = {"one", "two"};
     ASSERT_EQ(qoraSetVarNValueLabels(h(), vars, 2, values, labels, 2), QORA_STATUS_OK);
-    EXPECT_EQ(NLabel("n1", 9.0), "-9|");
-    EXPECT_EQ(NLabel("n2", 2.0), "0|two");
     ASSERT_EQ(qoraSetVarNValueLabel(h(), "n1", 3.0, "three"), QORA_STATUS_OK);
-    EXPECT_EQ(NLabel("n2", 3.0), "-9|");
+    EXPECT_EQ(NLabels("n1") + " " + NLabels("n2"), "0|1=one|2=two|3=three 0|1=one|2=two");
 
-    double* outValues = nullptr;
-    char** outLabels = nullptr;
-    int count = 0;
-    ASSERT_EQ(qoraGetVarNValueLabels(h(), "n1", &outValues, &outLabels, &count), QORA_STATUS_OK);
-    ASSERT_EQ(count, 3);
-    EXPECT_EQ(std::vector<double>(outValues, outValues + 3), (std::vector<double>{1, 2, 3}));
-    EXPECT_STREQ(outLabels[2], "three");
-    EXPECT_EQ(qoraFreeVarNValueLabels(outValues, outLabels, count), QORA_STATUS_OK);
-
-    // The first failing variable stops the call before anything changes.
     const char* bad[] = {"n1", "s8"};
-    EXPECT_EQ(qoraSetVarNValueLabels(h(), bad, 2, values, labels, 2), QORA_STATUS_NUMERIC_REQUIRED);
     const char* absent[] = {"n1", "zz"};
-    EXPECT_EQ(qoraSetVarNValueLabels(h(), absent, 2, values, labels, 2), QORA_STATUS_VAR_NOT_FOUND);
-    EXPECT_EQ(NLabel("n1", 3.0), "0|three");
     const std::string longLabel(121, 'z');
     const char* cut[] = {"one", longLabel.c_str()};
+    const char* mixed[] = {"s8", "s10"};
+    const char* numeric[] = {"s8", "n1"};
+    const char* same[] = {"s8", "t8"};
+    const char* letters[] = {"a", "b"};
+    const char* capitals[] = {"A", "B"};
+    ASSERT_EQ(qoraSetVarCValueLabel(h(), "s10", "q", "Q"), QORA_STATUS_OK);
+    const struct {
+        int status, expected;
+    } rows[] = {
+        {qoraSetVarNValueLabels(h(), bad, 2, values, labels, 2), QORA_STATUS_NUMERIC_REQUIRED},
+        {qoraSetVarNValueLabels(h(), absent, 2, values, labels, 2), QORA_STATUS_VAR_NOT_FOUND},
+        {qoraSetVarNValueLabels(h(), vars, 2, nullptr, labels, 2), QORA_STATUS_BAD_FILE_HANDLE},
+        {qoraSetVarNValueLabels(h(), nullptr, 2, values, labels, 2), QORA_STATUS_BAD_FILE_HANDLE},
+        {qoraSetVarCValueLabels(h(), mixed, 2, letters, capitals, 2), QORA_STATUS_WIDTH_MISMATCH},
+        {qoraSetVarCValueLabels(h(), numeric, 2, letters, capitals, 2),
+         QORA_STATUS_STRING_REQUIRED},
+    };
+    for (size_t i = 0; i < std::size(rows); ++i)
+        EXPECT_EQ(rows[i].status, rows[i].expected) << "row " << i;
+    EXPECT_EQ(NLabel("n1", 3.0) + " " + CLabel("s8", "a") + " " + CLabel("s10", "q"),
+              "0|three -8| 0|Q");
     EXPECT_EQ(qoraSetVarNValueLabels(h(), vars, 2, values, cut, 2),
               QORA_WARN_VALUE_LABEL_TRUNCATED);
-    EXPECT_EQ(qoraSetVarNValueLabels(h(), vars, 2, nullptr, labels, 2),
-              QORA_STATUS_BAD_FILE_HANDLE);
-    EXPECT_EQ(qoraSetVarNValueLabels(h(), nullptr, 2, values, labels, 2),
-              QORA_STATUS_BAD_FILE_HANDLE);
-}
-
-TEST_F(ValueLabels, StringSetFormsNeedOneWidth) {
-    const char* values[] = {"a", "b"};
-    const char* labels[] = {"A", "B"};
-    const char* mixed[] = {"s8", "s10"};
-    ASSERT_EQ(qoraSetVarCValueLabel(h(), "s10", "q", "Q"), QORA_STATUS_OK);
-    EXPECT_EQ(qoraSetVarCValueLabels(h(), mixed, 2, values, labels, 2), QORA_STATUS_WIDTH_MISMATCH);
-    EXPECT_EQ(CLabel("s8", "a"), "-8|");
-    EXPECT_EQ(CLabel("s10", "q"), "0|Q");
-    const char* numeric[] = {"s8", "n1"};
-    EXPECT_EQ(qoraSetVarCValueLabels(h(), numeric, 2, values, labels, 2),
-              QORA_STATUS_STRING_REQUIRED);
-    const char* same[] = {"s8", "t8"};
-    ASSERT_EQ(qoraSetVarCValueLabels(h(), same, 2, values, labels, 2), QORA_STATUS_OK);
-    EXPECT_EQ(CLabel("t8", "b"), "0|B");
-    EXPECT_EQ(CLabel("s8", "a"), "0|A");
-}
-
-TEST_F(ValueLabels, ArrayCallsClearTheirOutputsOnFailure) {
-    double* values = reinterpret_cast<double*>(this);
-    char** labels = reinterpret_cast<char**>(this);
-    int count = 7;
-    EXPECT_EQ(qoraGetVarNValueLabels(h(), "n1", &values, &labels, &count), QORA_WARN_NO_LABELS);
-    EXPECT_EQ(values, nullptr);
-    EXPECT_EQ(labels, nullptr);
-    EXPECT_EQ(count, 0);
-    char** strings = labels;
-    EXPECT_EQ(qoraGetVarCValueLabels(h(), "n1", &strings, &labels, &count),
-              QORA_STATUS_STRING_REQUIRED);
-    EXPECT_EQ(qoraGetVarNValueLabels(h(), "n1", nullptr, &labels, &count),
-              QORA_STATUS_BAD_FILE_HANDLE);
-    EXPECT_EQ(qoraFreeVarNValueLabels(nullptr, nullptr, 5), QORA_STATUS_OK);
-    EXPECT_EQ(qoraFreeVarCValueLabels(nullptr, nullptr, 5), QORA_STATUS_OK);
+    ASSERT_EQ(qoraSetVarCValueLabels(h(), same, 2, letters, capitals, 2), QORA_STATUS_OK);
+    EXPECT_EQ(CLabel("t8", "b") + " " + CLabel("s8", "a"), "0|B 0|A");
 }
 
 }  // namespace

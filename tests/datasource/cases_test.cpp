@@ -114,8 +114,8 @@ TEST(CompressedCodes, BothEncodersWriteTheCodesOfTheLayout) {
     // clang-format on
     // Each alone, then all in one case: whole blocks are coded eight units at a time.
     std::vector<Value> row;
-    Bytes all, block, raws;
-    for (size_t i = 0; i < std::size(codes); ++i) {
+    Bytes all;
+    for (size_t i = 0, block = 0; i < std::size(codes); ++i) {
         const auto& [value, code] = codes[i];
         SCOPED_TRACE(value.IsString() ? value.Text() : std::to_string(value.Number()));
         const Bytes raw = code == 253 ? SysFileBuilder().Unit(value) : Bytes();
@@ -123,15 +123,12 @@ TEST(CompressedCodes, BothEncodersWriteTheCodesOfTheLayout) {
         expected.insert(expected.end(), raw.begin(), raw.end());
         ExpectBothEncoders({{value}}, expected);
         row.push_back(value);
-        block.push_back(uint8_t(code));
-        raws.insert(raws.end(), raw.begin(), raw.end());
-        if (block.size() == 8 || i + 1 == std::size(codes)) {
-            block.resize(8, 0);
-            all.insert(all.end(), block.begin(), block.end());
-            all.insert(all.end(), raws.begin(), raws.end());
-            block.clear();
-            raws.clear();
+        if (i % 8 == 0) {  // a block's control bytes, then the raws of its codes
+            block = all.size();
+            all.resize(block + 8, 0);
         }
+        all[block + i % 8] = uint8_t(code);
+        all.insert(all.end(), raw.begin(), raw.end());
     }
     ExpectBothEncoders({row}, all);
     ExpectBothEncoders({{1.0, 2.0, 3.0, "ABCDEFGH"}},

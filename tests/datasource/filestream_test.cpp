@@ -15,12 +15,6 @@
 
 namespace {
 
-std::vector<char> Pattern(size_t n, int seed = 0) {
-    std::vector<char> bytes(n);
-    for (size_t i = 0; i < n; ++i) bytes[i] = static_cast<char>((i * 7 + seed) % 251);
-    return bytes;
-}
-
 std::vector<char> Get(const std::string& path) {
     std::ifstream in(path, std::ios::binary);
     return std::vector<char>(std::istreambuf_iterator<char>(in), {});
@@ -35,7 +29,8 @@ TEST(FileStream, WriteReadBackMixedSizes) {
     {
         QORA_FileStream s(path.c_str(), "w+b");
         for (size_t n : {3u, 4093u, 1u, 9000u, 4096u, 200u, 4095u, 5000u}) {
-            const std::vector<char> part = Pattern(n, static_cast<int>(n));
+            std::vector<char> part(n);
+            for (size_t i = 0; i < n; ++i) part[i] = static_cast<char>((i * 7 + n) % 251);
             ASSERT_EQ(n, s.Write(part.data(), static_cast<uint32_t>(n)));
             expect.insert(expect.end(), part.begin(), part.end());
         }

@@ -23,32 +23,30 @@ TEST(Movers, CutVeryLongStringsIntoSegments) {
         const char* name;
         int width;
         std::string text;
-        std::vector<std::string> segments;  // each as written, padding included
+        std::string segments;  // as written, padding included
     };
     const std::string e = "\xc3\xa9", zhong = "\xe4\xb8\xad";  // two bytes, three
     // clang-format off
     const Cut cuts[] = {
         {"multipleOf252", 504, std::string(504, 'b'),
-         {std::string(255, 'b') + ' ', std::string(249, 'b') + std::string(7, ' ')}},
+         std::string(255, 'b') + ' ' + std::string(249, 'b') + std::string(7, ' ')},
         {"blankAt254", 300, std::string(254, 'c') + ' ' + e + std::string(43, 'c'),
-         {std::string(254, 'c') + "  ", e + std::string(43, 'c') + "   "}},
+         std::string(254, 'c') + "  " + e + std::string(43, 'c') + "   "},
         {"characterAcross255", 300, std::string(254, 'd') + e + std::string(44, 'd'),
-         {std::string(254, 'd') + '\0' + ' ', e + std::string(44, 'd') + "  "}},
+         std::string(254, 'd') + '\0' + ' ' + e + std::string(44, 'd') + "  "},
         {"threeBytesAcross255", 300, std::string(253, 'f') + zhong + std::string(44, 'f'),
-         {std::string(253, 'f') + std::string(2, '\0') + ' ', zhong + std::string(44, 'f') + ' '}},
+         std::string(253, 'f') + std::string(2, '\0') + ' ' + zhong + std::string(44, 'f') + ' '},
     };
     // clang-format on
     for (const Cut& cut : cuts) {
         SCOPED_TRACE(cut.name);
         std::string source =
             cut.text + std::string(8 * size_t(ValueUnits(cut.width)) - cut.width, ' ');
-        std::string expected;
-        for (const std::string& segment : cut.segments) expected += segment;
-        std::string output(expected.size(), '?');
+        std::string output(cut.segments.size(), '?');
         SaveDS::EStringMover mover(reinterpret_cast<unsigned char*>(&output[0]), cut.width);
         const auto* begin = reinterpret_cast<const unsigned char*>(source.data());
         EXPECT_EQ(mover.Move(begin), begin + source.size());
-        EXPECT_EQ(output, expected);
+        EXPECT_EQ(output, cut.segments);
         // Joined again, the NULs that stand for a cut character are dropped.
         SystemFileDechunker plan;
         plan.Add(SystemFileDechunker::StringEntry(0, uint32_t(cut.width), 0, 0));

@@ -1,7 +1,8 @@
 // Writes the seed corpus of the open-and-read fuzz target into a directory:
-// small files in both byte orders, raw and compressed, that between them use
-// every kind of dictionary record, and files in several encodings, so the
-// fuzzer starts from deep inside the reader instead of from the magic number.
+// the sample file, which has every kind of dictionary record, and a plain
+// file, both in either byte order, raw and compressed, and files in several
+// encodings, so the fuzzer starts from deep inside the reader instead of from
+// the magic number.
 #include <cstdint>
 #include <cstdio>
 #include <fstream>
@@ -14,42 +15,6 @@
 using namespace fixture;
 
 namespace {
-
-Bytes RichFile(Endian endian, bool compressed) {
-    SysFileBuilder b(endian);
-    b.Compressed(compressed);
-    b.header().label = "Seed";
-    b.Numeric("NUM").Label("A labelled number").Missing({-1.0, -2.0, 99.0});
-    b.Numeric("RANGE").MissingRange(-9.0, -1.0, 999.0);
-    b.Numeric("LOW").MissingRange(kLowest, 0.0);
-    b.String("SHORT", 4).Label("Short string").MissingStrings({"NA", "X"});
-    b.String("MEDIUM", 20).Formats(StringFormat(20), StringFormat(20));
-    b.String("VERYLONG", 300).LongName("VeryLongText");
-    b.Numeric("WHEN").Formats(FormatWord(20, 11, 0), FormatWord(20, 11, 0));
-    b.ValueLabels({{1.0, "One"}, {2.0, "Two"}, {kSysmis, "System-missing"}},
-                  {b.Slot("NUM"), b.Slot("RANGE")});
-    b.ValueLabels({{"NA", "Not answered"}}, {b.Slot("SHORT")});
-    b.Documents({"First document line", "Second document line"});
-    b.IntegerInfo();
-    b.FloatInfo();
-    b.DateInfo({1, 2, 7, 1, 1, 2});
-    b.DisplayParams(
-        {{1, 8, 1}, {2, 8, 1}, {3, 8, 1}, {1, 4, 0}, {1, 20, 0}, {1, 40, 0}, {1, 40, 0}, {3, 11, 1}});
-    b.LongNames();
-    b.VeryLongStrings();
-    b.CaseCount64(3);
-    b.FileAttributes(SysFileBuilder::AttributeText({{"Origin", {"seed"}}}));
-    b.VariableAttributes({{"NUM", SysFileBuilder::AttributeText({{"Unit", {"cm", "mm"}}})}});
-    b.LongValueLabelsRecord({{"MEDIUM", 20, {{"first", "The first value"}}}});
-    b.MultipleResponseSets({SysFileBuilder::CategorySetLine("$SET", "A set", {"NUM", "RANGE"})});
-    b.VariableSets({SysFileBuilder::VariableSetLine("Numbers", {"NUM", "RANGE", "LOW"})});
-    b.Encoding("UTF-8");
-    b.Extension(40, 1, Bytes{'o', 'p', 'a', 'q', 'u', 'e'});
-    b.Case({1.0, 2.5, kSysmis, "NA", "twenty bytes wide...", std::string(300, 'v'), 0.0});
-    b.Case({-1.0, 999.0, 151.0, "abcd", "", "short", DateValue(2000, 1, 1)});
-    b.Case({kSysmis, -99.0, 1e100, "    ", "x", "", kSysmis});
-    return b.Build();
-}
 
 Bytes PlainFile(Endian endian, bool compressed) {
     SysFileBuilder b(endian);
@@ -92,13 +57,13 @@ int main(int argc, char** argv) {
         return 2;
     }
     const std::string dir = argv[1];
-    bool ok = Write(dir + "/sample.qsf", SampleFile());
+    bool ok = true;
     for (Endian endian : {Endian::Native, Endian::Swapped}) {
         for (bool compressed : {false, true}) {
             const std::string suffix =
                 std::string(endian == Endian::Native ? "native" : "swapped") +
                 (compressed ? "-compressed" : "-raw") + ".qsf";
-            ok = Write(dir + "/rich-" + suffix, RichFile(endian, compressed)) && ok;
+            ok = Write(dir + "/sample-" + suffix, SampleFile(endian, compressed)) && ok;
             ok = Write(dir + "/plain-" + suffix, PlainFile(endian, compressed)) && ok;
         }
     }

@@ -16,16 +16,17 @@ long DayNumber(int year, int month, int day) {
     return era * 146097 + dayOfEra;
 }
 
-}  // namespace
-
+// Seconds since 14 October 1582 at midnight of the given day.
 double DateValue(int year, int month, int day) {
     return double(DayNumber(year, month, day) - DayNumber(1582, 10, 14)) * 86400.0;
 }
 
-Bytes SampleFile() {
-    SysFileBuilder b(Endian::Native);
+}  // namespace
+
+Bytes SampleFile(Endian endian, bool compressed) {
+    SysFileBuilder b(endian);
     b.header().label = "Sample survey";
-    b.Compressed();
+    b.Compressed(compressed);
     b.Numeric("ID")
         .LongName("Id")
         .Label("Respondent number")
@@ -50,6 +51,10 @@ Bytes SampleFile() {
                  "   (Entered 04 Dec 26)"});
     b.IntegerInfo();
     b.FloatInfo();
+    b.VariableSets({SysFileBuilder::VariableSetLine("Answers", {"SEX", "SCORE", "CITY"})});
+    b.DateInfo({0, 1, 1, 1, 1, 1, 1, 2, 1});  // the respondent number counts the cases
+    b.MultipleResponseSets({SysFileBuilder::CategorySetLine("$scores", "Scores", {"ID", "SCORE"}),
+                            SysFileBuilder::DichotomySetLine("$ones", "1", "Ones", {"ID", "SEX"})});
     b.DisplayParams({{3, 5, 1},
                      {1, 5, 1},
                      {3, 8, 1},
@@ -61,12 +66,14 @@ Bytes SampleFile() {
                      {1, 40, 0}});
     b.LongNames();
     b.VeryLongStrings();
+    b.CaseCount64(12);
     b.FileAttributes(SysFileBuilder::AttributeText({{"Source", {"fixture builder"}}}));
     b.VariableAttributes({{"Score", SysFileBuilder::AttributeText({{"Unit", {"points"}}})}});
     b.LongValueLabelsRecord(
         {{"CountryOfBirth",
           20,
           {{"United Kingdom", "Born in the United Kingdom"}, {"France", "Born in France"}}}});
+    b.Extension(30, 4, b.Int32s({1, 2, 3}));
 
     const double sysmis = kSysmis;
     b.Case({1.0, 1.0, 87.5, "LDN", "friendly", DateValue(1970, 1, 1), "United Kingdom",

@@ -97,8 +97,6 @@ uint32_t StringFormat(int width) {
     return (1u << 16) | (uint32_t(width & 0xFF) << 8) | uint32_t(width >> 8 & 0xFF);
 }
 
-// ---------------------------------------------------------------- TempDir
-
 TempDir::TempDir() {
     std::string test = "outside-test";
     if (const auto* info = ::testing::UnitTest::GetInstance()->current_test_info())
@@ -123,8 +121,6 @@ void Patch(Bytes& bytes, size_t offset, const Bytes& with) {
     if (offset + with.size() > bytes.size()) throw std::out_of_range("patch past the end");
     std::copy(with.begin(), with.end(), bytes.begin() + offset);
 }
-
-// ---------------------------------------------------------------- Var
 
 Var::Var(std::string name, int width, int slot)
     : fName(std::move(name)), fWidth(width), fSlot(slot) {}
@@ -185,8 +181,6 @@ Var& Var::Continuations(int count) {
     fContinuations = count;
     return *this;
 }
-
-// ---------------------------------------------------------------- header and dictionary
 
 SysFileBuilder::SysFileBuilder(Endian endian) : fEndian(endian) {}
 
@@ -440,9 +434,8 @@ SysFileBuilder& SysFileBuilder::RawRecord(Bytes bytes) {
     return *this;
 }
 
-SysFileBuilder& SysFileBuilder::EndRecord(bool write, int32_t filler) {
+SysFileBuilder& SysFileBuilder::EndRecord(bool write) {
     fWriteEnd = write;
-    fEndFiller = filler;
     return *this;
 }
 
@@ -485,22 +478,15 @@ Bytes SysFileBuilder::Dictionary() const {
     }
     if (fWriteEnd) {
         out.I32(999);
-        out.I32(fEndFiller);
+        out.I32(0);
     }
     return out.bytes;
 }
-
-// ---------------------------------------------------------------- case data
 
 SysFileBuilder& SysFileBuilder::Case(std::vector<Value> values) {
     if (values.size() != fVars.size())
         throw std::invalid_argument("a case needs one value per variable");
     fCases.push_back(std::move(values));
-    return *this;
-}
-
-SysFileBuilder& SysFileBuilder::Data(Bytes bytes) {
-    fTrailing.insert(fTrailing.end(), bytes.begin(), bytes.end());
     return *this;
 }
 
@@ -552,11 +538,10 @@ namespace {
 // their own, everything else follows the control bytes raw.
 uint8_t CompressionCode(const std::array<uint8_t, 8>& bytes) {
     if (std::all_of(bytes.begin(), bytes.end(), [](uint8_t b) { return b == ' '; })) return 254;
-    double value;
-    std::memcpy(&value, bytes.data(), 8);
     uint64_t bits;
     std::memcpy(&bits, bytes.data(), 8);
     if (bits == 0xFFEFFFFFFFFFFFFFull) return 255;
+    const double value = FromBits(bits);
     const bool whole = std::trunc(value) == value && !(value == 0.0 && std::signbit(value));
     if (whole && value >= -99.0 && value <= 151.0) return uint8_t(value + 100.0);
     return 253;
@@ -585,20 +570,14 @@ Bytes SysFileBuilder::Compress(const std::vector<CaseUnit>& units) const {
 Bytes SysFileBuilder::CaseData() const {
     std::vector<CaseUnit> units;
     for (const auto& row : fCases) AppendCase(units, row);
+    if (fCompressed) return Compress(units);
     Bytes data;
-    if (fCompressed) {
-        data = Compress(units);
-    } else {
-        for (const CaseUnit& unit : units) {
-            Bytes raw = FileUnit(unit);
-            data.insert(data.end(), raw.begin(), raw.end());
-        }
+    for (const CaseUnit& unit : units) {
+        const Bytes raw = FileUnit(unit);
+        data.insert(data.end(), raw.begin(), raw.end());
     }
-    data.insert(data.end(), fTrailing.begin(), fTrailing.end());
     return data;
 }
-
-// ---------------------------------------------------------------- encoders and output
 
 Bytes SysFileBuilder::Int32(int32_t value) const { return Int32s({value}); }
 
@@ -620,21 +599,10 @@ Bytes SysFileBuilder::Unit(const Value& value) const {
     return out.bytes;
 }
 
-Bytes SysFileBuilder::Block(std::array<uint8_t, 8> codes, const std::vector<Value>& raws) const {
-    Bytes block(codes.begin(), codes.end());
-    for (const Value& raw : raws) {
-        Bytes unit = Unit(raw);
-        block.insert(block.end(), unit.begin(), unit.end());
-    }
-    return block;
-}
-
 Bytes SysFileBuilder::Build() const {
     Bytes file = HeaderBytes();
-    Bytes dictionary = Dictionary();
-    Bytes data = CaseData();
-    file.insert(file.end(), dictionary.begin(), dictionary.end());
-    file.insert(file.end(), data.begin(), data.end());
+    for (const Bytes& part : {Dictionary(), CaseData()})
+        file.insert(file.end(), part.begin(), part.end());
     return file;
 }
 
@@ -652,8 +620,6 @@ std::string SysFileBuilder::WriteTemp(const Bytes& bytes, const std::string& fil
     if (!file.flush()) throw std::runtime_error("cannot write " + path);
     return path;
 }
-
-// ---------------------------------------------------------------- record texts
 
 std::string SysFileBuilder::AttributeText(
     const std::vector<std::pair<std::string, std::vector<std::string>>>& attributes) {

@@ -212,23 +212,18 @@ class SysFileBuilder {
 
     // Bytes placed as they are among the dictionary records.
     SysFileBuilder& RawRecord(Bytes bytes);
-    // Whether the type 999 record is written, and its filler.
-    SysFileBuilder& EndRecord(bool write, int32_t filler = 0);
+    // Whether the type 999 record is written.
+    SysFileBuilder& EndRecord(bool write);
 
     // Case data. One value per variable; numbers for numeric variables,
     // strings for string variables (a mismatch is written as given).
     SysFileBuilder& Case(std::vector<Value> values);
-    // Bytes appended after the cases (after the last block when compressed),
-    // e.g. hand-made blocks; they do not count as cases in the header.
-    SysFileBuilder& Data(Bytes bytes);
 
     // Encoders in the builder's byte order.
     Bytes Int32(int32_t value) const;
     Bytes Int32s(const std::vector<int32_t>& values) const;
     Bytes Int64(int64_t value) const;
     Bytes Unit(const Value& value) const;  // one 8-byte value unit
-    // One compressed block: 8 control bytes and the raw units that follow.
-    Bytes Block(std::array<uint8_t, 8> codes, const std::vector<Value>& raws) const;
 
     Bytes Build() const;
     size_t DataStart() const;  // offset of the first byte of the case data
@@ -274,11 +269,9 @@ class SysFileBuilder {
     Header fHeader;
     bool fCompressed = false;
     bool fWriteEnd = true;
-    int32_t fEndFiller = 0;
     std::deque<Var> fVars;
     std::vector<Record> fRecords;
     std::vector<std::vector<Value>> fCases;
-    Bytes fTrailing;
     mutable std::shared_ptr<TempDir> fTempDir;
 };
 
