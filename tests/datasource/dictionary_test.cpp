@@ -189,6 +189,27 @@ TEST(VLMapTest, KeysThatReadAsNaNStayFindable) {
     EXPECT_EQ(*map.Lookup(std::nan("")), "nan");
 }
 
+// Adding pairs at once is adding them one by one: a repeated key keeps its
+// last label, with few pairs and with many, and a copy that shared the map
+// keeps what it had.
+TEST(VLMapTest, InsertAllIsInsertOneByOne) {
+    for (int count : {3, 16, 17, 40}) {
+        QORA_VLMap all(8), single(8);
+        all.Insert("before", -1, "b");
+        single.Insert("before", -1, "b");
+        const QORA_VLMap copy = all;
+        std::vector<QORA_VLMapImpl::Pair> pairs;
+        for (int i = 0; i < count; ++i) {
+            const std::string key = all.KeyFromText(std::to_string(i * 7 % 11).c_str(), -1);
+            pairs.push_back({key, "l" + std::to_string(i)});
+            single.Insert(key.data(), pairs.back().label);
+        }
+        all.InsertAll(pairs);
+        EXPECT_TRUE(all == single) << count;
+        EXPECT_EQ(copy.Count(), 1) << count;
+    }
+}
+
 TEST(AttributesTest, TextFormBytesAndRoundTrip) {
     Attributes a;
     a.Set("Size", {"1", "2"});
