@@ -223,11 +223,6 @@ void QORA_VariableSet::SetVariable(size_t k, std::string name) {
     fVariables[k] = std::move(name);
 }
 
-void QORA_VariableSet::RemoveVariable(size_t k) {
-    QORA_ASSERT(k < fVariables.size());
-    fVariables.erase(fVariables.begin() + static_cast<std::ptrdiff_t>(k));
-}
-
 bool QORA_VariableSet::RemoveVariablesIf(const std::function<bool(const std::string&)>& unwanted) {
     const auto kept = std::remove_if(fVariables.begin(), fVariables.end(), unwanted);
     const bool removed = kept != fVariables.end();

@@ -68,8 +68,6 @@ class QORA_VariableSet {
     void AddVariable(std::string_view name);
     // Renames in place, keeping the position; precondition k < count.
     void SetVariable(size_t k, std::string name);
-    // Precondition k < count.
-    void RemoveVariable(size_t k);
     // Removes every member the predicate names; returns whether any went.
     bool RemoveVariablesIf(const std::function<bool(const std::string&)>& unwanted);
 
